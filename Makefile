@@ -1,0 +1,35 @@
+# Front door. Every target first installs what is missing (scripts/install-deps).
+BUILD_DIR ?= build/test
+SAN_DIR ?= build/sanitize
+BENCH_DIR ?= build/release
+JOBS ?= $(shell nproc)
+CMAKE_GEN = -G Ninja
+
+.PHONY: deps test test-sanitize demo bench format build
+
+deps:
+	@scripts/install-deps
+
+build: deps
+	cmake -S . -B $(BUILD_DIR) $(CMAKE_GEN) -DCMAKE_BUILD_TYPE=RelWithDebInfo -DAPE_BUILD_BENCHMARKS=OFF
+	cmake --build $(BUILD_DIR) -j $(JOBS)
+
+test: build
+	ctest --test-dir $(BUILD_DIR) --output-on-failure -j $(JOBS)
+
+test-sanitize: deps
+	cmake -S . -B $(SAN_DIR) $(CMAKE_GEN) -DCMAKE_BUILD_TYPE=Debug -DAPE_SANITIZE=ON -DAPE_BUILD_BENCHMARKS=OFF
+	cmake --build $(SAN_DIR) -j $(JOBS)
+	ASAN_OPTIONS=detect_leaks=1 UBSAN_OPTIONS=print_stacktrace=1 \
+	  ctest --test-dir $(SAN_DIR) --output-on-failure -j $(JOBS)
+
+demo: build
+	$(BUILD_DIR)/bin/ape-demo
+
+bench: deps
+	cmake -S . -B $(BENCH_DIR) $(CMAKE_GEN) -DCMAKE_BUILD_TYPE=Release -DCMAKE_CXX_FLAGS_RELEASE=-O2 -DAPE_BUILD_TESTS=OFF
+	cmake --build $(BENCH_DIR) -j $(JOBS)
+	@for b in $(BENCH_DIR)/bin/bench-*; do echo "== $$b"; $$b --benchmark_counters_tabular=true; done
+
+format:
+	git ls-files '*.h' '*.cpp' | xargs clang-format -i
