@@ -8,11 +8,11 @@
 
 // Describes a channel type (132 bytes).
 struct ChannelType {
-  char TypeName[80];        // NUL-terminated
-  GUID TypeGuid;            // offset 80
-  GUID BaseTypeGuid;        // offset 96
+  char TypeName[80];  // NUL-terminated
+  GUID TypeGuid;      // offset 80
+  GUID BaseTypeGuid;  // offset 96
   std::uint8_t Reserved112[8];
-  std::uint32_t TypeWord;   // offset 120; the emitter sets 1 in its own record
+  std::uint32_t TypeWord;  // offset 120; the emitter sets 1 in its own record
   std::uint8_t Reserved124[8];
 
   // Empty name, zero GUIDs and words.
@@ -29,14 +29,14 @@ static_assert(offsetof(ChannelType, Reserved124) == 124);
 
 // Describes one child link of a channel (264 bytes, passed by value).
 struct ChildCreation {
-  ChannelType Type;              // the type the link accepts
-  std::int32_t LinkPosition;     // offset 132: the link's index, or -1 for a many-channel link
-  std::uint8_t Flag;             // offset 136
-  std::uint8_t LinkFlag;         // offset 137
-  char LinkName[102];            // offset 138, NUL-terminated
-  GUID ExtraGuid;                // offset 240
-  std::int32_t ExtraWord256;     // offset 256
-  std::int32_t ExtraWord260;     // offset 260
+  ChannelType Type;           // the type the link accepts
+  std::int32_t LinkPosition;  // offset 132: the link's index, or -1 for a many-channel link
+  std::uint8_t Flag;          // offset 136
+  std::uint8_t LinkFlag;      // offset 137
+  char LinkName[102];         // offset 138, NUL-terminated
+  GUID ExtraGuid;             // offset 240
+  std::int32_t ExtraWord256;  // offset 256
+  std::int32_t ExtraWord260;  // offset 260
 
   // Host type defaults with both GUIDs set to the 0x11 pattern; position -1, flags 0, empty
   // name, zero GUID, words 0 and 1.

@@ -12,6 +12,7 @@ class Tev_DX8_DeviceChannel : public Qen_Channel {
   Tev_DX8_DeviceChannel(const Tev_DX8_DeviceChannel&) = delete;
   Tev_DX8_DeviceChannel& operator=(const Tev_DX8_DeviceChannel&) = delete;
   ChannelType GetChannelType() override;
+  static ChannelType TypeRecord();  // what GetChannelType answers
 
   virtual IDirect3DDevice9* GetDevice();
   virtual HRESULT SetTextureStageState(DWORD stage, D3DTEXTURESTAGESTATETYPE type, DWORD value);
@@ -23,3 +24,11 @@ class Tev_DX8_DeviceChannel : public Qen_Channel {
  private:
   IDirect3DDevice9* Device = nullptr;
 };
+
+class Qen_HostContext;
+
+// The context's device channel (the first channel of the device channel type), or null; null
+// for a null context.
+Tev_DX8_DeviceChannel* FindDeviceChannel(Qen_HostContext* context);
+// Its device, or null when there is no device channel or it holds no device.
+IDirect3DDevice9* FindDevice(Qen_HostContext* context);

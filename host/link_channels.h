@@ -9,6 +9,7 @@ class Qen_ValueChannel : public Qen_Channel {
  public:
   explicit Qen_ValueChannel(float value = 0.0f);
   ChannelType GetChannelType() override;
+  static ChannelType TypeRecord();  // what GetChannelType answers
 
   virtual float GetValue();
   virtual float GetPreviousValue();  // the value before the last SetValue
@@ -23,6 +24,7 @@ class Qen_ValueVectorChannel : public Qen_Channel {
  public:
   explicit Qen_ValueVectorChannel(D3DXVECTOR3 vector = {0.0f, 0.0f, 0.0f});
   ChannelType GetChannelType() override;
+  static ChannelType TypeRecord();  // what GetChannelType answers
 
   virtual D3DXVECTOR3 GetVector();
   virtual void SetVector(D3DXVECTOR3 vector);
@@ -36,6 +38,7 @@ class Qen_MatrixChannel : public Qen_Channel {
   Qen_MatrixChannel();  // identity
   explicit Qen_MatrixChannel(const D3DXMATRIX& matrix);
   ChannelType GetChannelType() override;
+  static ChannelType TypeRecord();  // what GetChannelType answers
 
   virtual void SetMatrix(const D3DXMATRIX& matrix);
   virtual D3DXMATRIX GetMatrix();
@@ -55,6 +58,7 @@ class Qen_TextureChannel : public Qen_Channel {
   Qen_TextureChannel(const Qen_TextureChannel& other);
   Qen_TextureChannel& operator=(const Qen_TextureChannel& other);
   ChannelType GetChannelType() override;
+  static ChannelType TypeRecord();  // what GetChannelType answers
 
   virtual void SetTexture(IDirect3DTexture9* texture);  // null drops it
   virtual IDirect3DTexture9* GetTexture();

@@ -3,6 +3,7 @@
 // as an indexed triangle list. The particle emitter derives from it.
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <vector>
 
@@ -40,6 +41,14 @@ class Tev_DX8_ObjectDataChannel : public Tev_DX8_D3DDeviceUse {
  public:
   static constexpr DWORD kFvf = D3DFVF_XYZ | D3DFVF_NORMAL | D3DFVF_DIFFUSE | D3DFVF_TEX1;
   static constexpr int kTextureSets = 1;
+  // Texture mappings MapTexture applies (GetTextureMapping answers the last one).
+  static constexpr int kMappingNone = 0;
+  static constexpr int kMappingPlanar = 1;  // along Z: u from x, v from y
+  static constexpr int kMappingSphere = 2;
+  static constexpr int kMappingCylinder = 3;  // around Y
+  static constexpr int kMappingCubic = 4;
+  // More vertices than this need 32-bit indices.
+  static constexpr std::size_t k16BitVertexLimit = 65536;
 
   Tev_DX8_ObjectDataChannel();
   Tev_DX8_ObjectDataChannel(const Tev_DX8_ObjectDataChannel& other);
@@ -111,10 +120,15 @@ class Tev_DX8_ObjectDataChannel : public Tev_DX8_D3DDeviceUse {
   virtual IDirect3DIndexBuffer9* GetIndexBuffer();
 
   // Built-in shapes for hosts and tools (replace the present mesh; world matrix untouched).
-  void BuildQuad(float width, float depth);               // in the XZ plane, facing +Y
+  void BuildQuad(float width, float depth);  // in the XZ plane, facing +Y
   void BuildBox(D3DXVECTOR3 half_extents);
   void BuildUvSphere(float radius, int slices, int stacks);
-  void BuildDisc(float radius, int segments);             // in the XZ plane, facing +Y
+  void BuildDisc(float radius, int segments);  // in the XZ plane, facing +Y
+
+  // The box GetObjectTransformedMinMaxBox computed last (zero before).
+  D3DXVECTOR3 GetTransformedBoxMin() const { return TransformedBoxMin; }
+  D3DXVECTOR3 GetTransformedBoxMax() const { return TransformedBoxMax; }
+  bool UsesIndexBuffer32() const { return IndexBuffer32; }
 
   // The Direct3D vertex buffer once CreateVertexBuffer has run (null before and after Release).
   // Derived channels write it directly.
@@ -131,5 +145,18 @@ class Tev_DX8_ObjectDataChannel : public Tev_DX8_D3DDeviceUse {
   VertTUVOffset TuvOffset{0.0f, 0.0f};
   int PolygonType = static_cast<int>(D3DPT_TRIANGLELIST);
   int TextureTransform = 0;
-  std::vector<Qen_Channel*> CustomDataChannels;
+  std::vector<Qen_Channel*> CustomDataChannels;  // not owned
+  int TextureMapping = kMappingNone;
+  D3DXVECTOR3 TransformedBoxMin{0.0f, 0.0f, 0.0f};
+  D3DXVECTOR3 TransformedBoxMax{0.0f, 0.0f, 0.0f};
+  // What the buffers were built with: drawing never reaches past them, whatever the lists do
+  // after CreateVertexBuffer.
+  UINT BufferVertexCount = 0;
+  UINT BufferIndexCount = 0;
+
+ private:
+  void ReleaseBuffers();
+  void CopyMeshFrom(const Tev_DX8_ObjectDataChannel& other);
+  bool FillVertexBuffer(IDirect3DDevice9* device);
+  bool FillIndexBuffer(IDirect3DDevice9* device);
 };

@@ -20,27 +20,28 @@ void FillTypeRecord(ChannelType* record, const char* type_name, const GUID& type
                     const GUID& base_type, std::uint32_t type_word);
 }  // namespace ape_plugin
 
-#define APE_CHANNEL_PLUGIN(Class, type_name, type_guid, base_guid, type_word)          \
-  namespace {                                                                         \
-  ChannelType& PluginTypeRecord() {                                                   \
-    static ChannelType record;                                                        \
-    return record;                                                                    \
-  }                                                                                   \
-  [[gnu::constructor]] void PluginAttach() {                                          \
-    PluginTypeRecord();                                                               \
-    DisableThreadLibraryCalls(nullptr);                                               \
-  }                                                                                   \
-  }                                                                                   \
-  extern "C" ChannelType* GetType() {                                                 \
-    ape_plugin::FillTypeRecord(&PluginTypeRecord(), type_name, type_guid, base_guid,  \
-                               type_word);                                            \
-    return &PluginTypeRecord();                                                       \
-  }                                                                                   \
-  extern "C" Qen_Channel* InitDLL() {                                                 \
-    try {                                                                             \
-      return new Class();                                                             \
-    } catch (...) {                                                                   \
-      return nullptr;                                                                 \
-    }                                                                                 \
-  }                                                                                   \
-  ChannelType Class::GetChannelType() { return *GetType(); }
+#define APE_CHANNEL_PLUGIN(Class, type_name, type_guid, base_guid, type_word)                    \
+  namespace {                                                                                    \
+  ChannelType& PluginTypeRecord() {                                                              \
+    static ChannelType record;                                                                   \
+    return record;                                                                               \
+  }                                                                                              \
+  [[gnu::constructor]] void PluginAttach() {                                                     \
+    PluginTypeRecord();                                                                          \
+    DisableThreadLibraryCalls(nullptr);                                                          \
+  }                                                                                              \
+  }                                                                                              \
+  extern "C" ChannelType* GetType() {                                                            \
+    ape_plugin::FillTypeRecord(&PluginTypeRecord(), type_name, type_guid, base_guid, type_word); \
+    return &PluginTypeRecord();                                                                  \
+  }                                                                                              \
+  extern "C" Qen_Channel* InitDLL() {                                                            \
+    try {                                                                                        \
+      return new Class();                                                                        \
+    } catch (...) {                                                                              \
+      return nullptr;                                                                            \
+    }                                                                                            \
+  }                                                                                              \
+  ChannelType Class::GetChannelType() {                                                          \
+    return *GetType();                                                                           \
+  }

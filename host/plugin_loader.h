@@ -15,6 +15,15 @@ using GetTypeFunction = ChannelType* (*)();
 using InitDllFunction = Qen_Channel* (*)();
 }
 
+// A channel type built into the host: its record and its factory.
+struct BuiltInChannelType {
+  ChannelType Record;
+  Qen_Channel* (*Create)();
+};
+// The types the host knows without loading anything: "Value", "Value Vector", "Matrix",
+// "Texture" and the device channel.
+const std::vector<BuiltInChannelType>& BuiltInChannelTypes();
+
 class PluginLoader {
  public:
   // The folder named by APE_PLUGIN_DIR when set, else the build's plug-in folder.
@@ -44,12 +53,19 @@ class PluginLoader {
  private:
   struct LoadedType {
     ChannelType Record;
-    void* Library = nullptr;         // null for built-in types
+    void* Library = nullptr;  // null for built-in types
     InitDllFunction Create = nullptr;
     Qen_Channel* (*CreateBuiltIn)() = nullptr;
     Qen_List Dependencies;
   };
   bool LoadType(GUID type, std::string* error, int depth);
+
+  LoadedType* Find(GUID type);
+  const LoadedType* Find(GUID type) const;
+  bool LoadPluginLibrary(GUID type, std::string* error, int depth);
+  bool LoadDependencies(LoadedType& loaded, std::string* error, int depth);
+  // Forgets (and unloads) every type from `count` on: a failed load leaves nothing behind.
+  void TruncateTypes(std::size_t count);
 
   std::string folder_;
   std::vector<std::pair<GUID, LoadedType>> types_;

@@ -87,6 +87,9 @@ class Qen_Channel {
 
   Qen_HostContext* GetHostContext() const { return HostContext; }
 
+  // The most links a channel may declare; a larger index or count is refused.
+  static constexpr int kMaximumLinkCount = 4096;
+
  protected:
   Qen_HostContext* HostContext;
 
@@ -97,8 +100,24 @@ class Qen_Channel {
     std::vector<Qen_Channel*> Channels;  // one entry at most for a single-channel link
   };
   bool Accepts(const LinkSlot& slot, Qen_Channel* child);
+  LinkSlot* DeclaredSlot(int index);
+  const LinkSlot* DeclaredSlot(int index) const;
+  // Every change of a link goes through these two, so that Parents stays exact.
+  void Link(LinkSlot& slot, Qen_Channel* child);
+  void UnlinkAt(LinkSlot& slot, std::size_t position);
+  void EmptySlot(LinkSlot& slot);
+  // Drops the links other channels hold to this one.
+  void DetachFromParents();
+  void CopyLinksFrom(const Qen_Channel& other);
+
+  // The context forgets its channels' context pointer when it goes first, and unlinks a
+  // channel it unregisters.
+  friend class Qen_HostContext;
 
   std::string ChannelName;
   std::vector<LinkSlot> Links;
   std::uint32_t TimeStamp = 0;
+  // The channels whose links hold this one, once per link entry: a channel going away leaves
+  // nothing dangling, whichever context its parents belong to.
+  std::vector<Qen_Channel*> Parents;
 };
