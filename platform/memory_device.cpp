@@ -353,7 +353,7 @@ HRESULT MemoryDevice::SetTransform(D3DTRANSFORMSTATETYPE state, const D3DMATRIX*
   // The matrix is logged by value, row by row, as float bit patterns.
   std::vector<std::uint64_t> args{state};
   if (matrix != nullptr) {
-    args.reserve(1 + MatrixArgCount());
+    args.reserve(1 + 16);
     for (const auto& row : matrix->m)
       for (float v : row) args.push_back(FloatArg(v));
   }

@@ -22,7 +22,7 @@ class BufferBytes {
     journal_->Log(std::string(kind_) + ".Lock", {journal_->IdOf(self), offset, size, flags});
     if (data != nullptr) *data = nullptr;
     if (DeviceJournal::TakeFailure(journal_->fail_buffer_lock)) return D3DERR_INVALIDCALL;
-    if (data == nullptr || offset > bytes_.size()) return D3DERR_INVALIDCALL;
+    if (data == nullptr || offset >= bytes_.size()) return D3DERR_INVALIDCALL;
     // Size 0 locks from the offset to the end.
     const std::uint64_t end = size == 0 ? bytes_.size() : std::uint64_t{offset} + size;
     if (end > bytes_.size()) return D3DERR_INVALIDCALL;
