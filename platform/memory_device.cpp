@@ -1,141 +1,31 @@
 #include "platform/memory_device.h"
 
 #include <cstdint>
-#include <map>
 #include <memory>
-#include <new>
 
+#include "platform/d3d9_defaults.h"
 #include "platform/memory_journal.h"
 #include "platform/memory_resources.h"
 
 namespace {
 
-// Render states outside the shared enumeration whose defaults the table also carries.
-enum ExtraRenderState : std::uint32_t {
-  kFogStart = 36,
-  kFogEnd = 37,
-  kFogDensity = 38,
-  kStencilFail = 53,
-  kStencilZFail = 54,
-  kStencilPass = 55,
-  kStencilFunc = 56,
-  kStencilMask = 58,
-  kStencilWriteMask = 59,
-  kTextureFactor = 60,
-  kClipping = 136,
-  kLocalViewer = 142,
-  kDiffuseMaterialSource = 145,
-  kSpecularMaterialSource = 146,
-  kMultisampleAntialias = 161,
-  kMultisampleMask = 162,
-  kPositionDegree = 172,
-  kNormalDegree = 173,
-  kMinTessellationLevel = 178,
-  kMaxTessellationLevel = 179,
-  kAdaptiveTessZ = 182,
-  kCcwStencilFail = 186,
-  kCcwStencilZFail = 187,
-  kCcwStencilPass = 188,
-  kCcwStencilFunc = 189,
-  kColorWriteEnable1 = 190,
-  kColorWriteEnable2 = 191,
-  kColorWriteEnable3 = 192,
-  kBlendFactor = 193,
-  kSrcBlendAlpha = 207,
-  kDestBlendAlpha = 208,
-  kBlendOpAlpha = 209,
-};
-
-constexpr DWORD kStencilOpKeep = 1;
-constexpr DWORD kMaterialColor1 = 1;
-constexpr DWORD kMaterialColor2 = 2;
-constexpr DWORD kDegreeLinear = 1;
-constexpr DWORD kDegreeCubic = 3;
-constexpr DWORD kAllBits = 0xFFFFFFFFu;
-
-// Texture stage states outside the shared enumeration.
-constexpr std::uint32_t kColorArg0 = 26;
-constexpr std::uint32_t kAlphaArg0 = 27;
-constexpr std::uint32_t kResultArg = 28;
-
 // The viewport of the notional 640 x 480 back buffer.
 constexpr D3DVIEWPORT9 kDefaultViewport{0, 0, 640, 480, 0.0f, 1.0f};
 
-struct RenderStateDefault {
-  std::uint32_t state;
-  DWORD value;
-};
+// Slots of the transform table: view, projection, eight texture matrices, 256 world matrices.
+constexpr std::size_t kTextureTransformSlot = 2;
+constexpr std::size_t kWorldTransformSlot = kTextureTransformSlot + kD3DTextureStageCount;
+constexpr std::size_t kTransformSlotCount = kWorldTransformSlot + 256;
+constexpr std::size_t kNoTransformSlot = kTransformSlotCount;
 
-// Direct3D 9's documented defaults; every state not listed starts at 0.
-const RenderStateDefault kRenderStateDefaults[] = {
-    {D3DRS_ZENABLE, D3DZB_TRUE},
-    {D3DRS_FILLMODE, D3DFILL_SOLID},
-    {D3DRS_SHADEMODE, D3DSHADE_GOURAUD},
-    {D3DRS_ZWRITEENABLE, TRUE},
-    {D3DRS_ALPHATESTENABLE, FALSE},
-    {D3DRS_LASTPIXEL, TRUE},
-    {D3DRS_SRCBLEND, D3DBLEND_ONE},
-    {D3DRS_DESTBLEND, D3DBLEND_ZERO},
-    {D3DRS_CULLMODE, D3DCULL_CCW},
-    {D3DRS_ZFUNC, D3DCMP_LESSEQUAL},
-    {D3DRS_ALPHAREF, 0},
-    {D3DRS_ALPHAFUNC, D3DCMP_ALWAYS},
-    {D3DRS_DITHERENABLE, FALSE},
-    {D3DRS_ALPHABLENDENABLE, FALSE},
-    {D3DRS_FOGENABLE, FALSE},
-    {D3DRS_SPECULARENABLE, FALSE},
-    {kFogStart, FloatToStateBits(0.0f)},
-    {kFogEnd, FloatToStateBits(1.0f)},
-    {kFogDensity, FloatToStateBits(1.0f)},
-    {kStencilFail, kStencilOpKeep},
-    {kStencilZFail, kStencilOpKeep},
-    {kStencilPass, kStencilOpKeep},
-    {kStencilFunc, D3DCMP_ALWAYS},
-    {kStencilMask, kAllBits},
-    {kStencilWriteMask, kAllBits},
-    {kTextureFactor, kAllBits},
-    {kClipping, TRUE},
-    {D3DRS_LIGHTING, TRUE},
-    {D3DRS_AMBIENT, 0},
-    {D3DRS_COLORVERTEX, TRUE},
-    {kLocalViewer, TRUE},
-    {D3DRS_NORMALIZENORMALS, FALSE},
-    {kDiffuseMaterialSource, kMaterialColor1},
-    {kSpecularMaterialSource, kMaterialColor2},
-    {D3DRS_POINTSIZE, FloatToStateBits(1.0f)},
-    {D3DRS_POINTSIZE_MIN, FloatToStateBits(1.0f)},
-    {D3DRS_POINTSPRITEENABLE, FALSE},
-    {D3DRS_POINTSCALEENABLE, FALSE},
-    {D3DRS_POINTSCALE_A, FloatToStateBits(1.0f)},
-    {D3DRS_POINTSCALE_B, FloatToStateBits(0.0f)},
-    {D3DRS_POINTSCALE_C, FloatToStateBits(0.0f)},
-    {kMultisampleAntialias, TRUE},
-    {kMultisampleMask, kAllBits},
-    {D3DRS_POINTSIZE_MAX, FloatToStateBits(64.0f)},
-    {D3DRS_COLORWRITEENABLE, D3DCOLORWRITEENABLE_ALL},
-    {D3DRS_BLENDOP, D3DBLENDOP_ADD},
-    {kPositionDegree, kDegreeCubic},
-    {kNormalDegree, kDegreeLinear},
-    {kMinTessellationLevel, FloatToStateBits(1.0f)},
-    {kMaxTessellationLevel, FloatToStateBits(1.0f)},
-    {kAdaptiveTessZ, FloatToStateBits(1.0f)},
-    {kCcwStencilFail, kStencilOpKeep},
-    {kCcwStencilZFail, kStencilOpKeep},
-    {kCcwStencilPass, kStencilOpKeep},
-    {kCcwStencilFunc, D3DCMP_ALWAYS},
-    {kColorWriteEnable1, D3DCOLORWRITEENABLE_ALL},
-    {kColorWriteEnable2, D3DCOLORWRITEENABLE_ALL},
-    {kColorWriteEnable3, D3DCOLORWRITEENABLE_ALL},
-    {kBlendFactor, kAllBits},
-    {kSrcBlendAlpha, D3DBLEND_ONE},
-    {kDestBlendAlpha, D3DBLEND_ZERO},
-    {kBlendOpAlpha, D3DBLENDOP_ADD},
-};
-
-bool IsTransformState(std::uint32_t state) {
-  return state == D3DTS_VIEW || state == D3DTS_PROJECTION ||
-         (state >= D3DTS_TEXTURE0 && state < D3DTS_TEXTURE0 + kD3DTextureStageCount) ||
-         (state >= D3DTS_WORLD && state < D3DTS_WORLD + 256);
+std::size_t TransformSlot(std::uint32_t state) {
+  if (state == D3DTS_VIEW) return 0;
+  if (state == D3DTS_PROJECTION) return 1;
+  if (state >= D3DTS_TEXTURE0 && state < D3DTS_TEXTURE0 + kD3DTextureStageCount)
+    return kTextureTransformSlot + (state - D3DTS_TEXTURE0);
+  if (state >= D3DTS_WORLD && state < D3DTS_WORLD + 256)
+    return kWorldTransformSlot + (state - D3DTS_WORLD);
+  return kNoTransformSlot;
 }
 
 D3DMATRIX IdentityMatrix() {
@@ -163,10 +53,6 @@ std::uint64_t VerticesOf(D3DPRIMITIVETYPE type, UINT primitive_count) {
   return 0;
 }
 
-std::uint64_t MatrixArgCount() {
-  return 16;
-}
-
 }  // namespace
 
 struct MemoryDevice::State {
@@ -174,7 +60,7 @@ struct MemoryDevice::State {
   ULONG refs = 1;
   DWORD render_states[kD3DRenderStateCount] = {};
   DWORD stage_states[kD3DTextureStageCount][kD3DTextureStageStateCount] = {};
-  std::map<std::uint32_t, D3DMATRIX> transforms;  // absent = identity
+  D3DMATRIX transforms[kTransformSlotCount];
   D3DVIEWPORT9 viewport = kDefaultViewport;
   DWORD fvf = 0;
   bool in_scene = false;
@@ -194,20 +80,13 @@ MemoryDevice* MemoryDevice::Create() {
 }
 
 MemoryDevice::MemoryDevice() : state_(new State) {
-  for (const RenderStateDefault& d : kRenderStateDefaults) state_->render_states[d.state] = d.value;
-  for (DWORD stage = 0; stage < kD3DTextureStageCount; ++stage) {
-    DWORD* s = state_->stage_states[stage];
-    s[D3DTSS_COLOROP] = stage == 0 ? D3DTOP_MODULATE : D3DTOP_DISABLE;
-    s[D3DTSS_ALPHAOP] = stage == 0 ? D3DTOP_SELECTARG1 : D3DTOP_DISABLE;
-    s[D3DTSS_COLORARG1] = D3DTA_TEXTURE;
-    s[D3DTSS_COLORARG2] = D3DTA_CURRENT;
-    s[D3DTSS_ALPHAARG1] = D3DTA_TEXTURE;
-    s[D3DTSS_ALPHAARG2] = D3DTA_CURRENT;
-    s[D3DTSS_TEXCOORDINDEX] = stage;
-    s[kColorArg0] = D3DTA_CURRENT;
-    s[kAlphaArg0] = D3DTA_CURRENT;
-    s[kResultArg] = D3DTA_CURRENT;
-  }
+  for (std::uint32_t rs = 0; rs < kD3DRenderStateCount; ++rs)
+    state_->render_states[rs] = D3D9DefaultRenderState(static_cast<D3DRENDERSTATETYPE>(rs));
+  for (DWORD stage = 0; stage < kD3DTextureStageCount; ++stage)
+    for (std::uint32_t type = 0; type < kD3DTextureStageStateCount; ++type)
+      state_->stage_states[stage][type] =
+          D3D9DefaultTextureStageState(stage, static_cast<D3DTEXTURESTAGESTATETYPE>(type));
+  for (D3DMATRIX& m : state_->transforms) m = IdentityMatrix();
 }
 
 MemoryDevice::~MemoryDevice() {
@@ -227,7 +106,7 @@ ULONG MemoryDevice::Release() {
 HRESULT MemoryDevice::CreateVertexBuffer(UINT length, DWORD usage, DWORD fvf, D3DPOOL pool,
                                          IDirect3DVertexBuffer9** buffer, HANDLE* /*shared*/) {
   DeviceJournal& j = *state_->journal;
-  j.Log("CreateVertexBuffer", {length, usage, fvf, pool});
+  j.Record("CreateVertexBuffer", {length, usage, fvf, pool});
   if (buffer != nullptr) *buffer = nullptr;
   if (DeviceJournal::TakeFailure(j.fail_create_vertex_buffer)) return D3DERR_INVALIDCALL;
   return CreateMemoryVertexBuffer(state_->journal, length, usage, fvf, pool, buffer);
@@ -236,7 +115,7 @@ HRESULT MemoryDevice::CreateVertexBuffer(UINT length, DWORD usage, DWORD fvf, D3
 HRESULT MemoryDevice::CreateIndexBuffer(UINT length, DWORD usage, D3DFORMAT format, D3DPOOL pool,
                                         IDirect3DIndexBuffer9** buffer, HANDLE* /*shared*/) {
   DeviceJournal& j = *state_->journal;
-  j.Log("CreateIndexBuffer", {length, usage, format, pool});
+  j.Record("CreateIndexBuffer", {length, usage, format, pool});
   if (buffer != nullptr) *buffer = nullptr;
   if (DeviceJournal::TakeFailure(j.fail_create_index_buffer)) return D3DERR_INVALIDCALL;
   return CreateMemoryIndexBuffer(state_->journal, length, usage, format, pool, buffer);
@@ -246,7 +125,7 @@ HRESULT MemoryDevice::CreateTexture(UINT width, UINT height, UINT levels, DWORD 
                                     D3DFORMAT format, D3DPOOL pool, IDirect3DTexture9** texture,
                                     HANDLE* /*shared*/) {
   DeviceJournal& j = *state_->journal;
-  j.Log("CreateTexture", {width, height, levels, usage, format, pool});
+  j.Record("CreateTexture", {width, height, levels, usage, format, pool});
   if (texture != nullptr) *texture = nullptr;
   if (DeviceJournal::TakeFailure(j.fail_create_texture)) return D3DERR_INVALIDCALL;
   return CreateMemoryTexture(state_->journal, width, height, levels, usage, format, pool, texture);
@@ -255,7 +134,7 @@ HRESULT MemoryDevice::CreateTexture(UINT width, UINT height, UINT levels, DWORD 
 HRESULT MemoryDevice::SetStreamSource(UINT stream, IDirect3DVertexBuffer9* buffer, UINT offset,
                                       UINT stride) {
   DeviceJournal& j = *state_->journal;
-  j.Log("SetStreamSource", {stream, j.IdOf(buffer), offset, stride});
+  j.Record("SetStreamSource", {stream, j.IdOf(buffer), offset, stride});
   // One stream is all the callers use; a buffer of another device cannot be bound.
   if (stream != 0 || (buffer != nullptr && !j.Owns(buffer))) return D3DERR_INVALIDCALL;
   j.stream = buffer;
@@ -266,14 +145,14 @@ HRESULT MemoryDevice::SetStreamSource(UINT stream, IDirect3DVertexBuffer9* buffe
 
 HRESULT MemoryDevice::SetIndices(IDirect3DIndexBuffer9* buffer) {
   DeviceJournal& j = *state_->journal;
-  j.Log("SetIndices", {j.IdOf(buffer)});
+  j.Record("SetIndices", {j.IdOf(buffer)});
   if (buffer != nullptr && !j.Owns(buffer)) return D3DERR_INVALIDCALL;
   j.indices = buffer;
   return S_OK;
 }
 
 HRESULT MemoryDevice::SetFVF(DWORD fvf) {
-  state_->journal->Log("SetFVF", {fvf});
+  state_->journal->Record("SetFVF", {fvf});
   state_->fvf = fvf;
   return S_OK;
 }
@@ -281,7 +160,7 @@ HRESULT MemoryDevice::SetFVF(DWORD fvf) {
 HRESULT MemoryDevice::DrawPrimitive(D3DPRIMITIVETYPE type, UINT start_vertex,
                                     UINT primitive_count) {
   DeviceJournal& j = *state_->journal;
-  j.Log("DrawPrimitive", {type, start_vertex, primitive_count});
+  j.Record("DrawPrimitive", {type, start_vertex, primitive_count});
   const std::uint64_t vertices = VerticesOf(type, primitive_count);
   if (vertices == 0 || j.stream == nullptr || j.stream_stride == 0) return D3DERR_INVALIDCALL;
   D3DVERTEXBUFFER_DESC desc{};
@@ -296,8 +175,8 @@ HRESULT MemoryDevice::DrawIndexedPrimitive(D3DPRIMITIVETYPE type, INT base_verte
                                            UINT min_vertex_index, UINT num_vertices,
                                            UINT start_index, UINT primitive_count) {
   DeviceJournal& j = *state_->journal;
-  j.Log("DrawIndexedPrimitive", {type, SignedArg(base_vertex_index), min_vertex_index, num_vertices,
-                                 start_index, primitive_count});
+  j.Record("DrawIndexedPrimitive", {type, SignedArg(base_vertex_index), min_vertex_index,
+                                    num_vertices, start_index, primitive_count});
   const std::uint64_t indices = VerticesOf(type, primitive_count);
   if (indices == 0 || j.stream == nullptr || j.stream_stride == 0 || j.indices == nullptr)
     return D3DERR_INVALIDCALL;
@@ -309,14 +188,14 @@ HRESULT MemoryDevice::DrawIndexedPrimitive(D3DPRIMITIVETYPE type, INT base_verte
 }
 
 HRESULT MemoryDevice::SetRenderState(D3DRENDERSTATETYPE state, DWORD value) {
-  state_->journal->Log("SetRenderState", {state, value});
+  state_->journal->Record("SetRenderState", {state, value});
   if (state >= kD3DRenderStateCount) return D3DERR_INVALIDCALL;
   state_->render_states[state] = value;
   return S_OK;
 }
 
 HRESULT MemoryDevice::GetRenderState(D3DRENDERSTATETYPE state, DWORD* value) {
-  state_->journal->Log("GetRenderState", {state});
+  state_->journal->Record("GetRenderState", {state});
   if (value == nullptr || state >= kD3DRenderStateCount) return D3DERR_INVALIDCALL;
   *value = state_->render_states[state];
   return S_OK;
@@ -324,7 +203,7 @@ HRESULT MemoryDevice::GetRenderState(D3DRENDERSTATETYPE state, DWORD* value) {
 
 HRESULT MemoryDevice::SetTextureStageState(DWORD stage, D3DTEXTURESTAGESTATETYPE type,
                                            DWORD value) {
-  state_->journal->Log("SetTextureStageState", {stage, type, value});
+  state_->journal->Record("SetTextureStageState", {stage, type, value});
   if (stage >= kD3DTextureStageCount || type >= kD3DTextureStageStateCount)
     return D3DERR_INVALIDCALL;
   state_->stage_states[stage][type] = value;
@@ -333,7 +212,7 @@ HRESULT MemoryDevice::SetTextureStageState(DWORD stage, D3DTEXTURESTAGESTATETYPE
 
 HRESULT MemoryDevice::GetTextureStageState(DWORD stage, D3DTEXTURESTAGESTATETYPE type,
                                            DWORD* value) {
-  state_->journal->Log("GetTextureStageState", {stage, type});
+  state_->journal->Record("GetTextureStageState", {stage, type});
   if (value == nullptr || stage >= kD3DTextureStageCount || type >= kD3DTextureStageStateCount)
     return D3DERR_INVALIDCALL;
   *value = state_->stage_states[stage][type];
@@ -342,7 +221,7 @@ HRESULT MemoryDevice::GetTextureStageState(DWORD stage, D3DTEXTURESTAGESTATETYPE
 
 HRESULT MemoryDevice::SetTexture(DWORD stage, IDirect3DTexture9* texture) {
   DeviceJournal& j = *state_->journal;
-  j.Log("SetTexture", {stage, j.IdOf(texture)});
+  j.Record("SetTexture", {stage, j.IdOf(texture)});
   if (stage >= kD3DTextureStageCount || (texture != nullptr && !j.Owns(texture)))
     return D3DERR_INVALIDCALL;
   j.textures[stage] = texture;
@@ -350,40 +229,30 @@ HRESULT MemoryDevice::SetTexture(DWORD stage, IDirect3DTexture9* texture) {
 }
 
 HRESULT MemoryDevice::SetTransform(D3DTRANSFORMSTATETYPE state, const D3DMATRIX* matrix) {
-  // The matrix is logged by value, row by row, as float bit patterns.
-  std::vector<std::uint64_t> args{state};
-  if (matrix != nullptr) {
-    args.reserve(1 + 16);
-    for (const auto& row : matrix->m)
-      for (float v : row) args.push_back(FloatArg(v));
-  }
-  state_->journal->Log("SetTransform", std::move(args));
-  if (matrix == nullptr || !IsTransformState(state)) return D3DERR_INVALIDCALL;
-  state_->transforms[state] = *matrix;
+  state_->journal->RecordSetTransform(state, matrix);
+  const std::size_t slot = TransformSlot(state);
+  if (matrix == nullptr || slot == kNoTransformSlot) return D3DERR_INVALIDCALL;
+  state_->transforms[slot] = *matrix;
   return S_OK;
 }
 
 HRESULT MemoryDevice::GetTransform(D3DTRANSFORMSTATETYPE state, D3DMATRIX* matrix) {
-  state_->journal->Log("GetTransform", {state});
-  if (matrix == nullptr || !IsTransformState(state)) return D3DERR_INVALIDCALL;
-  *matrix = Transform(state);
+  state_->journal->Record("GetTransform", {state});
+  const std::size_t slot = TransformSlot(state);
+  if (matrix == nullptr || slot == kNoTransformSlot) return D3DERR_INVALIDCALL;
+  *matrix = state_->transforms[slot];
   return S_OK;
 }
 
 HRESULT MemoryDevice::SetViewport(const D3DVIEWPORT9* viewport) {
-  if (viewport == nullptr) {
-    state_->journal->Log("SetViewport", {});
-    return D3DERR_INVALIDCALL;
-  }
-  const D3DVIEWPORT9& v = *viewport;
-  state_->journal->Log("SetViewport",
-                       {v.X, v.Y, v.Width, v.Height, FloatArg(v.MinZ), FloatArg(v.MaxZ)});
-  state_->viewport = v;
+  state_->journal->RecordSetViewport(viewport);
+  if (viewport == nullptr) return D3DERR_INVALIDCALL;
+  state_->viewport = *viewport;
   return S_OK;
 }
 
 HRESULT MemoryDevice::GetViewport(D3DVIEWPORT9* viewport) {
-  state_->journal->Log("GetViewport", {});
+  state_->journal->Record("GetViewport", {});
   if (viewport == nullptr) return D3DERR_INVALIDCALL;
   *viewport = state_->viewport;
   return S_OK;
@@ -391,28 +260,19 @@ HRESULT MemoryDevice::GetViewport(D3DVIEWPORT9* viewport) {
 
 HRESULT MemoryDevice::Clear(DWORD count, const D3DRECT* rects, DWORD flags, D3DCOLOR color, float z,
                             DWORD stencil) {
-  // Rectangles are logged by value between the count and the flags.
-  std::vector<std::uint64_t> args{count};
-  if (rects != nullptr)
-    for (DWORD i = 0; i < count; ++i)
-      for (std::int32_t c : {rects[i].x1, rects[i].y1, rects[i].x2, rects[i].y2})
-        args.push_back(SignedArg(c));
-  for (std::uint64_t a :
-       {std::uint64_t{flags}, std::uint64_t{color}, FloatArg(z), std::uint64_t{stencil}})
-    args.push_back(a);
-  state_->journal->Log("Clear", std::move(args));
+  state_->journal->RecordClear(count, rects, flags, color, z, stencil);
   return count != 0 && rects == nullptr ? D3DERR_INVALIDCALL : S_OK;
 }
 
 HRESULT MemoryDevice::BeginScene() {
-  state_->journal->Log("BeginScene", {});
+  state_->journal->Record("BeginScene", {});
   if (state_->in_scene) return D3DERR_INVALIDCALL;
   state_->in_scene = true;
   return S_OK;
 }
 
 HRESULT MemoryDevice::EndScene() {
-  state_->journal->Log("EndScene", {});
+  state_->journal->Record("EndScene", {});
   if (!state_->in_scene) return D3DERR_INVALIDCALL;
   state_->in_scene = false;
   return S_OK;
@@ -463,8 +323,8 @@ DWORD MemoryDevice::BoundFvf() const {
 }
 
 D3DMATRIX MemoryDevice::Transform(D3DTRANSFORMSTATETYPE state) const {
-  const auto it = state_->transforms.find(state);
-  return it == state_->transforms.end() ? IdentityMatrix() : it->second;
+  const std::size_t slot = TransformSlot(state);
+  return slot == kNoTransformSlot ? IdentityMatrix() : state_->transforms[slot];
 }
 
 std::uint64_t MemoryDevice::ObjectId(const void* object) const {

@@ -2,8 +2,62 @@
 
 #include <utility>
 
-void DeviceJournal::Log(std::string name, std::vector<std::uint64_t> args) {
-  calls.push_back(DeviceCall{std::move(name), std::move(args)});
+void DeviceJournal::Log(std::string name, std::vector<std::uint64_t> args) noexcept {
+  try {
+    calls.push_back(DeviceCall{std::move(name), std::move(args)});
+  } catch (...) {
+    // A lost log entry is better than an exception thrown through a device call.
+  }
+}
+
+void DeviceJournal::Record(const char* name, std::initializer_list<std::uint64_t> args) noexcept {
+  try {
+    calls.push_back(DeviceCall{name, std::vector<std::uint64_t>(args)});
+  } catch (...) {
+    // As in Log.
+  }
+}
+
+void DeviceJournal::RecordSetTransform(D3DTRANSFORMSTATETYPE state,
+                                       const D3DMATRIX* matrix) noexcept {
+  try {
+    std::vector<std::uint64_t> args{state};
+    if (matrix != nullptr)
+      for (const auto& row : matrix->m)
+        for (float v : row) args.push_back(FloatArg(v));
+    Log("SetTransform", std::move(args));
+  } catch (...) {
+    // As in Log.
+  }
+}
+
+void DeviceJournal::RecordSetViewport(const D3DVIEWPORT9* viewport) noexcept {
+  if (viewport == nullptr) return Record("SetViewport", {});
+  const D3DVIEWPORT9& v = *viewport;
+  Record("SetViewport", {v.X, v.Y, v.Width, v.Height, FloatArg(v.MinZ), FloatArg(v.MaxZ)});
+}
+
+void DeviceJournal::RecordClear(DWORD count, const D3DRECT* rects, DWORD flags, D3DCOLOR color,
+                                float z, DWORD stencil) noexcept {
+  try {
+    std::vector<std::uint64_t> args{count};
+    if (rects != nullptr)
+      for (DWORD i = 0; i < count; ++i)
+        for (std::int32_t c : {rects[i].x1, rects[i].y1, rects[i].x2, rects[i].y2})
+          args.push_back(SignedArg(c));
+    for (std::uint64_t a :
+         {std::uint64_t{flags}, std::uint64_t{color}, FloatArg(z), std::uint64_t{stencil}})
+      args.push_back(a);
+    Log("Clear", std::move(args));
+  } catch (...) {
+    // As in Log.
+  }
+}
+
+void DeviceJournal::RecordLockRect(const void* texture, UINT level, const RECT& area,
+                                   DWORD flags) noexcept {
+  Record("Texture.LockRect", {IdOf(texture), level, SignedArg(area.left), SignedArg(area.top),
+                              SignedArg(area.right), SignedArg(area.bottom), flags});
 }
 
 std::uint64_t DeviceJournal::Register(const void* object) {

@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstdint>
+#include <initializer_list>
 #include <memory>
 #include <string>
 #include <unordered_map>
@@ -31,7 +32,21 @@ struct DeviceJournal {
   IDirect3DIndexBuffer9* indices = nullptr;
   IDirect3DTexture9* textures[kD3DTextureStageCount] = {};
 
-  void Log(std::string name, std::vector<std::uint64_t> args);
+  // Appends one call. The log never throws into a caller: under memory exhaustion the entry is
+  // lost instead.
+  void Log(std::string name, std::vector<std::uint64_t> args) noexcept;
+  void Record(const char* name, std::initializer_list<std::uint64_t> args) noexcept;
+  // The argument conventions for the calls that pass structures, shared by every device that
+  // keeps a journal so that the same calls give the same log:
+  // the state, then the matrix row by row as float bit patterns (only the state when null);
+  void RecordSetTransform(D3DTRANSFORMSTATETYPE state, const D3DMATRIX* matrix) noexcept;
+  // the six fields, floats as bit patterns (no arguments when null);
+  void RecordSetViewport(const D3DVIEWPORT9* viewport) noexcept;
+  // the count, each rectangle's corners (when rects is not null), flags, colour, z bits, stencil;
+  void RecordClear(DWORD count, const D3DRECT* rects, DWORD flags, D3DCOLOR color, float z,
+                   DWORD stencil) noexcept;
+  // the texture's id, the level, the rectangle (pass the whole level for a null one), flags.
+  void RecordLockRect(const void* texture, UINT level, const RECT& area, DWORD flags) noexcept;
   // Gives a new object the next id and counts it live.
   std::uint64_t Register(const void* object);
   // Drops a dying object's id, live count and bindings.

@@ -15,11 +15,15 @@ constexpr UINT kRowAlignment = 16;  // bytes
 // The lock bookkeeping shared by vertex and index buffers.
 class BufferBytes {
  public:
-  BufferBytes(std::shared_ptr<DeviceJournal> journal, const char* kind, UINT length)
-      : journal_(std::move(journal)), kind_(kind), bytes_(length) {}
+  BufferBytes(std::shared_ptr<DeviceJournal> journal, const char* lock_name,
+              const char* unlock_name, UINT length)
+      : journal_(std::move(journal)),
+        lock_name_(lock_name),
+        unlock_name_(unlock_name),
+        bytes_(length) {}
 
   HRESULT Lock(const void* self, UINT offset, UINT size, void** data, DWORD flags) {
-    journal_->Log(std::string(kind_) + ".Lock", {journal_->IdOf(self), offset, size, flags});
+    journal_->Record(lock_name_, {journal_->IdOf(self), offset, size, flags});
     if (data != nullptr) *data = nullptr;
     if (DeviceJournal::TakeFailure(journal_->fail_buffer_lock)) return D3DERR_INVALIDCALL;
     if (data == nullptr || offset >= bytes_.size()) return D3DERR_INVALIDCALL;
@@ -32,7 +36,7 @@ class BufferBytes {
   }
 
   HRESULT Unlock(const void* self) {
-    journal_->Log(std::string(kind_) + ".Unlock", {journal_->IdOf(self)});
+    journal_->Record(unlock_name_, {journal_->IdOf(self)});
     if (lock_count_ == 0) return D3DERR_INVALIDCALL;
     --lock_count_;
     return S_OK;
@@ -43,7 +47,8 @@ class BufferBytes {
 
  private:
   std::shared_ptr<DeviceJournal> journal_;
-  const char* kind_;
+  const char* lock_name_;
+  const char* unlock_name_;
   std::vector<BYTE> bytes_;
   int lock_count_ = 0;  // buffers, unlike textures, may be locked more than once
 };
@@ -52,7 +57,7 @@ class MemoryVertexBuffer final : public IDirect3DVertexBuffer9 {
  public:
   MemoryVertexBuffer(std::shared_ptr<DeviceJournal> journal, UINT length, DWORD usage, DWORD fvf,
                      D3DPOOL pool)
-      : bytes_(std::move(journal), "VertexBuffer", length),
+      : bytes_(std::move(journal), "VertexBuffer.Lock", "VertexBuffer.Unlock", length),
         desc_{D3DFMT_UNKNOWN, D3DRTYPE_VERTEXBUFFER, usage, pool, length, fvf} {
     bytes_.Journal().Register(Self());
   }
@@ -86,7 +91,7 @@ class MemoryIndexBuffer final : public IDirect3DIndexBuffer9 {
  public:
   MemoryIndexBuffer(std::shared_ptr<DeviceJournal> journal, UINT length, DWORD usage,
                     D3DFORMAT format, D3DPOOL pool)
-      : bytes_(std::move(journal), "IndexBuffer", length),
+      : bytes_(std::move(journal), "IndexBuffer.Lock", "IndexBuffer.Unlock", length),
         desc_{format, D3DRTYPE_INDEXBUFFER, usage, pool, length} {
     bytes_.Journal().Register(Self());
   }
@@ -173,9 +178,7 @@ class MemoryTexture final : public IDirect3DTexture9 {
       area = RECT{0, 0, static_cast<std::int32_t>(levels_[level].width),
                   static_cast<std::int32_t>(levels_[level].height)};
     }
-    journal_->Log("Texture.LockRect",
-                  {journal_->IdOf(Self()), level, SignedArg(area.left), SignedArg(area.top),
-                   SignedArg(area.right), SignedArg(area.bottom), flags});
+    journal_->RecordLockRect(Self(), level, area, flags);
     if (locked != nullptr) *locked = D3DLOCKED_RECT{0, nullptr};
     if (DeviceJournal::TakeFailure(journal_->fail_texture_lock)) return D3DERR_INVALIDCALL;
     if (locked == nullptr || level >= levels_.size()) return D3DERR_INVALIDCALL;
@@ -189,7 +192,7 @@ class MemoryTexture final : public IDirect3DTexture9 {
   }
 
   HRESULT UnlockRect(UINT level) override {
-    journal_->Log("Texture.UnlockRect", {journal_->IdOf(Self()), level});
+    journal_->Record("Texture.UnlockRect", {journal_->IdOf(Self()), level});
     if (level >= levels_.size() || !levels_[level].locked) return D3DERR_INVALIDCALL;
     levels_[level].locked = false;
     return S_OK;
