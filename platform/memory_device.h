@@ -10,7 +10,13 @@
 #include "platform/d3d9_interfaces.h"
 
 // One logged device call: the operation's name and its arguments as integers (enumerations and
-// DWORDs as they are, floats by bit pattern, pointers as the object's id or 0 for null).
+// DWORDs as they are, signed values sign-extended, floats by bit pattern, pointers as the object's
+// id or 0 for null; output pointers are left out). Structures passed in are logged by value:
+// SetTransform(state, 16 matrix elements row by row), SetViewport(X, Y, Width, Height, MinZ,
+// MaxZ), Clear(count, each rectangle's x1 y1 x2 y2, flags, colour, z, stencil). Buffer and texture
+// calls are named after their object: "VertexBuffer.Lock(id, offset, size, flags)",
+// "IndexBuffer.Unlock(id)", "Texture.LockRect(id, level, left, top, right, bottom, flags)" (a null
+// rect as the whole level), "Texture.UnlockRect(id, level)". AddRef/Release are not logged.
 struct DeviceCall {
   std::string Name;
   std::vector<std::uint64_t> Args;
@@ -20,6 +26,11 @@ struct DeviceCall {
   friend bool operator==(const DeviceCall&, const DeviceCall&) = default;
 };
 
+// Textures: 4 bytes per pixel for the 32-bit formats (3, 2, 1 for R8G8B8, R5G6B5, A8), rows
+// padded to a multiple of 16 bytes (honour the pitch); levels 0 gives the full mip chain, more
+// levels than the chain has is D3DERR_INVALIDCALL. Binding a buffer or texture takes no
+// reference; releasing a bound object unbinds it. Objects of another device cannot be bound.
+// Draws that would read past the bound buffers answer D3DERR_INVALIDCALL.
 class MemoryDevice final : public IDirect3DDevice9 {
  public:
   // Starts with a reference count of 1; Release() destroys it.
@@ -39,9 +50,8 @@ class MemoryDevice final : public IDirect3DDevice9 {
   HRESULT SetIndices(IDirect3DIndexBuffer9* buffer) override;
   HRESULT SetFVF(DWORD fvf) override;
   HRESULT DrawPrimitive(D3DPRIMITIVETYPE type, UINT start_vertex, UINT primitive_count) override;
-  HRESULT DrawIndexedPrimitive(D3DPRIMITIVETYPE type, INT base_vertex_index,
-                               UINT min_vertex_index, UINT num_vertices, UINT start_index,
-                               UINT primitive_count) override;
+  HRESULT DrawIndexedPrimitive(D3DPRIMITIVETYPE type, INT base_vertex_index, UINT min_vertex_index,
+                               UINT num_vertices, UINT start_index, UINT primitive_count) override;
   HRESULT SetRenderState(D3DRENDERSTATETYPE state, DWORD value) override;
   HRESULT GetRenderState(D3DRENDERSTATETYPE state, DWORD* value) override;
   HRESULT SetTextureStageState(DWORD stage, D3DTEXTURESTAGESTATETYPE type, DWORD value) override;
