@@ -1,4 +1,16 @@
 // "AdvPE_Attractor": a point force field for particles.
+//
+// The force at a point p, with d = Position - p and r = |d|:
+//   radial  = Strength * f(r) * d / r                       (towards Position; negative repels)
+//   swirl   = VortexStrength * f(r) * unit(VortexAxis x (p - Position))
+//   f(r)    = 1 / max(r, MinimumRadius)^2                    (InverseSquare)
+//           = max(0, 1 - r / Radius), 0 when Radius <= 0      (Linear)
+// At Position itself, and on the vortex axis, the direction is zero and so is that part of the
+// force. The result is always finite: NaN parts become 0 and the components are kept within the
+// float range.
+//
+// Linked values override the public fields: every GetForceAtPosition reads the links afresh, so
+// a host may change them at any time. The fields themselves are never written by the links.
 #pragma once
 
 #include "host/qen_channel.h"
@@ -8,10 +20,23 @@ class Tev_AdvPE_Attractor : public Qen_Channel {
  public:
   enum class Falloff { InverseSquare, Linear };
 
+  // The child links, by index.
+  enum Link : int {
+    kLinkPosition = 0,        // "Position" (Value Vector)
+    kLinkStrength = 1,        // "Strength" (Value)
+    kLinkLinearFalloff = 2,   // "Linear Falloff?" (Value): yes selects Falloff::Linear
+    kLinkMinimumRadius = 3,   // "Minimum Radius" (Value)
+    kLinkRadius = 4,          // "Radius" (Value)
+    kLinkVortexStrength = 5,  // "Vortex Strength" (Value)
+    kLinkVortexAxis = 6,      // "Vortex Axis" (Value Vector)
+    kLinkCount = 7,
+  };
+
   Tev_AdvPE_Attractor();
   ChannelType GetChannelType() override;
+  void DoDependencyInit(Qen_List* list) override;  // the link types
 
-  // The force at `position`; finite for every finite input.
+  // The force at `position`; finite for every finite input, zero for a non-finite one.
   D3DXVECTOR3 GetForceAtPosition(D3DXVECTOR3 position);
 
   // Host API.

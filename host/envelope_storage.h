@@ -1,7 +1,14 @@
 // "EnvelopeStorage": a curve of (x, y) keys that plug-ins sample, e.g. a particle's size over its
 // normalised age.
+//
+// The curve holds its end values outside the key range: no key gives 0, one key gives its y
+// everywhere, a NaN x gives the first key's y, -inf and +inf give the first and last key's y.
+// Keys with equal x keep the order they were given in; at exactly such an x the curve takes the
+// last of them (it is continuous from the right). Non-finite keys are refused by every setter
+// (AddKey and SetKeys skip them, ReplaceKey answers false), so the curve is always finite.
 #pragma once
 
+#include <cstddef>
 #include <vector>
 
 #include "host/qen_channel.h"
@@ -20,22 +27,29 @@ class Tev_EnvelopeStorage : public Qen_Channel {
   Tev_EnvelopeStorage();
   ChannelType GetChannelType() override;
 
-  // Contract used by plug-ins.
+  // Contract used by plug-ins; none of these allocates or throws.
   void Initialize();  // prepares the curve for sampling; cheap when nothing changed
   float GetEnvelopeValue(float x);
   float GetMinIndex();  // the first key's x (0 without keys)
   float GetMaxIndex();  // the last key's x (0 without keys)
 
-  // Host API.
-  void AddKey(float x, float y, Interpolation mode = Interpolation::Linear);
-  void SetKeys(const std::vector<Key>& keys);  // any order
-  bool RemoveKey(int index);                    // index in x order
-  bool ReplaceKey(int index, const Key& key);   // index in x order
+  // Host API. The setters may throw std::bad_alloc like any container.
+  void AddKey(float x, float y, Interpolation mode = Interpolation::Linear);  // after equal x
+  void SetKeys(const std::vector<Key>& keys);  // any order; non-finite keys are dropped
+  bool RemoveKey(int index);                   // index in x order
+  bool ReplaceKey(int index, const Key& key);  // index in x order; false when out of range
   void ClearKeys();
   int GetKeyCount() const;
   const std::vector<Key>& GetKeys() const;  // in x order
 
  private:
+  // Index of the last key whose x is at most `x`, for x strictly inside the key range.
+  std::size_t FindSpan(float x) const;
+  void InsertSorted(const Key& key);
+
   std::vector<Key> Keys;  // kept sorted by x
   bool Dirty = true;
+  // Set by Initialize when the keys are evenly spaced: the span is then found by one division.
+  bool EvenlySpaced = false;
+  double InverseSpacing = 0.0;  // spans per unit of x
 };

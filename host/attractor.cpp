@@ -1,0 +1,67 @@
+#include "host/attractor.h"
+
+#include "host/collision_vector.h"
+#include "host/sibling_links.h"
+#include "host/type_guids.h"
+#include "plugin/link_reading.h"
+
+namespace {
+
+constexpr SiblingLink kLinks[Tev_AdvPE_Attractor::kLinkCount] = {
+    {"Position", "Value Vector", kValueVectorGuid},
+    {"Strength", "Value", kValueGuid},
+    {"Linear Falloff?", "Value", kValueGuid},
+    {"Minimum Radius", "Value", kValueGuid},
+    {"Radius", "Value", kValueGuid},
+    {"Vortex Strength", "Value", kValueGuid},
+    {"Vortex Axis", "Value Vector", kValueVectorGuid},
+};
+
+// The field's value, or the linked one when the link is present.
+float ValueOr(const Qen_Channel& owner, int index, float field) {
+  Qen_ValueChannel* link = ValueLink(owner, index);
+  return link ? link->GetValue() : field;
+}
+D3DXVECTOR3 VectorOr(const Qen_Channel& owner, int index, const D3DXVECTOR3& field) {
+  Qen_ValueVectorChannel* link = VectorLink(owner, index);
+  return link ? link->GetVector() : field;
+}
+
+// f(r) of the field's description in the header.
+double FalloffFactor(bool linear, double minimum_radius, double radius, double r) {
+  if (linear) {
+    if (!(radius > 0.0)) return 0.0;
+    return std::max(0.0, 1.0 - r / radius);
+  }
+  // A non-positive (or NaN) minimum radius leaves the force uncapped; r = 0 has no direction.
+  const double capped = minimum_radius > 0.0 ? std::max(r, minimum_radius) : r;
+  return capped > 0.0 ? 1.0 / (capped * capped) : 0.0;
+}
+
+}  // namespace
+
+Tev_AdvPE_Attractor::Tev_AdvPE_Attractor() {
+  DeclareSiblingLinks(*this, kLinks, kLinkCount);
+}
+
+D3DXVECTOR3 Tev_AdvPE_Attractor::GetForceAtPosition(D3DXVECTOR3 position) {
+  if (!IsFinite(position)) return {0.0f, 0.0f, 0.0f};
+  Qen_ValueChannel* linear_link = ValueLink(*this, kLinkLinearFalloff);
+  const bool linear = linear_link ? IsYes(linear_link->GetValue()) : FalloffMode == Falloff::Linear;
+  const Vec3d centre = ToVec3d(VectorOr(*this, kLinkPosition, Position));
+  const Vec3d axis = ToVec3d(VectorOr(*this, kLinkVortexAxis, VortexAxis));
+  const double strength = ValueOr(*this, kLinkStrength, Strength);
+  const double vortex_strength = ValueOr(*this, kLinkVortexStrength, VortexStrength);
+  const Vec3d offset = ToVec3d(position) - centre;  // from the centre to the point
+  const double falloff = FalloffFactor(linear, ValueOr(*this, kLinkMinimumRadius, MinimumRadius),
+                                       ValueOr(*this, kLinkRadius, Radius), Length(offset));
+
+  Vec3d force = Normalized(-offset) * (strength * falloff);
+  force += Normalized(Cross(axis, offset)) * (vortex_strength * falloff);
+  return ToFiniteFloat(force);
+}
+
+void Tev_AdvPE_Attractor::DoDependencyInit(Qen_List* list) {
+  AddChannelGuidDepend(kValueGuid, list);
+  AddChannelGuidDepend(kValueVectorGuid, list);
+}
