@@ -118,23 +118,27 @@ bool PluginLoader::LoadPluginLibrary(GUID type, std::string* error, int depth) {
   if (init_dll == nullptr)
     return unload("plug-in " + path.string() + " has no InitDLL: " + DlErrorText());
 
-  const ChannelType* record = get_type();
-  if (record == nullptr) return unload("GetType of plug-in " + path.string() + " gave no record");
-  if (!(record->TypeGuid == type))
-    return unload("plug-in " + path.string() + " declares type " + FormatGuid(record->TypeGuid) +
-                  ", not " + guid_text);
-
-  // One probe channel tells what the type's channels need.
+  // Code of the plug-in runs from here on: what it throws is reported, never passed on.
   LoadedType loaded;
-  loaded.Record = *record;
-  loaded.Library = library;
-  loaded.Create = init_dll;
-  {
+  try {
+    const ChannelType* record = get_type();
+    if (record == nullptr) return unload("GetType of plug-in " + path.string() + " gave no record");
+    if (!(record->TypeGuid == type))
+      return unload("plug-in " + path.string() + " declares type " + FormatGuid(record->TypeGuid) +
+                    ", not " + guid_text);
+    loaded.Record = *record;
+    // One probe channel tells what the type's channels need.
     std::unique_ptr<Qen_Channel> probe(init_dll());
     if (probe == nullptr)
       return unload("InitDLL of plug-in " + path.string() + " created no channel");
     probe->DoDependencyInit(&loaded.Dependencies);
+  } catch (const std::exception& exception) {
+    return unload("plug-in " + path.string() + " threw: " + exception.what());
+  } catch (...) {
+    return unload("plug-in " + path.string() + " threw an unknown exception");
   }
+  loaded.Library = library;
+  loaded.Create = init_dll;
 
   const std::size_t mark = types_.size();
   const Qen_List dependencies = loaded.Dependencies;
