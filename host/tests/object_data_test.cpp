@@ -284,16 +284,27 @@ TEST_F(ObjectDataOnDevice, RebuildingReleasesThePreviousBuffers) {
   EXPECT_EQ(mesh.GetIndexCount(), 0);
 }
 
-using FailureInjection = void (MemoryDevice::*)();
+enum class FailingCall { CreateVertexBuffer, CreateIndexBuffer, BufferLock };
 
-class DeviceFailure : public ObjectDataOnDevice,
-                      public ::testing::WithParamInterface<FailureInjection> {};
+class DeviceFailure : public ObjectDataOnDevice, public ::testing::WithParamInterface<FailingCall> {
+ protected:
+  void FailNext(FailingCall call) {
+    switch (call) {
+      case FailingCall::CreateVertexBuffer:
+        return device_->FailNextCreateVertexBuffer();
+      case FailingCall::CreateIndexBuffer:
+        return device_->FailNextCreateIndexBuffer();
+      case FailingCall::BufferLock:
+        return device_->FailNextBufferLock();
+    }
+  }
+};
 
 TEST_P(DeviceFailure, LeavesNoBuffersBehind) {
   Tev_DX8_ObjectDataChannel mesh;
   Fill(mesh, 4, 2);
   ASSERT_TRUE(mesh.CreateVertexBuffer());  // the failed rebuild must drop these too
-  (device_->*GetParam())();
+  FailNext(GetParam());
   EXPECT_FALSE(mesh.CreateVertexBuffer());
   EXPECT_EQ(mesh.VertexBuffer, nullptr);
   EXPECT_EQ(mesh.GetIndexBuffer(), nullptr);
@@ -305,9 +316,9 @@ TEST_P(DeviceFailure, LeavesNoBuffersBehind) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Calls, DeviceFailure,
-                         ::testing::Values(&MemoryDevice::FailNextCreateVertexBuffer,
-                                           &MemoryDevice::FailNextCreateIndexBuffer,
-                                           &MemoryDevice::FailNextBufferLock));
+                         ::testing::Values(FailingCall::CreateVertexBuffer,
+                                           FailingCall::CreateIndexBuffer,
+                                           FailingCall::BufferLock));
 
 TEST(ObjectDataWithoutDevice, CreateVertexBufferFails) {
   Qen_HostContext context;

@@ -132,7 +132,8 @@ TEST_F(PluginLoading, UnknownTypeNameIsNamedInTheMessage) {
   std::string error;
   EXPECT_EQ(loader.CreateChannelByName("AdvancedParticleEmitter", &error), nullptr);
   EXPECT_THAT(error, HasSubstr("\"AdvancedParticleEmitter\""));
-  EXPECT_EQ(loader.CreateChannelByName("Value", nullptr) != nullptr, true);
+  std::unique_ptr<Qen_Channel> value(loader.CreateChannelByName("Value", nullptr));
+  EXPECT_NE(value, nullptr);
 }
 
 TEST_F(PluginLoading, DependenciesAreLoadedAndRecordedInOrder) {
