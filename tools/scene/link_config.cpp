@@ -1,0 +1,194 @@
+// A channel's "links": each link found by its own name (or index), and each value turned into
+// the channel it stands for.
+#include <algorithm>
+#include <cctype>
+#include <cstring>
+
+#include "host/link_channels.h"
+#include "host/qen_channel.h"
+#include "host/type_guids.h"
+#include "tools/scene/scene_builder.h"
+#include "tools/scene/scene_error.h"
+
+namespace apescene {
+namespace {
+
+const std::function<float(const Json&, const DocPath&)> kNumber = ReadNumber;
+const std::function<D3DXVECTOR3(const Json&, const DocPath&)> kVector = ReadVector3;
+const std::function<MatrixValue(const Json&, const DocPath&)> kMatrix = ReadMatrixValue;
+
+std::size_t EditDistance(const std::string& a, const std::string& b) {
+  std::vector<std::size_t> row(b.size() + 1);
+  for (std::size_t j = 0; j <= b.size(); ++j) row[j] = j;
+  for (std::size_t i = 1; i <= a.size(); ++i) {
+    std::size_t diagonal = row[0];
+    row[0] = i;
+    for (std::size_t j = 1; j <= b.size(); ++j) {
+      const std::size_t up = row[j];
+      const bool same = std::tolower(static_cast<unsigned char>(a[i - 1])) ==
+                        std::tolower(static_cast<unsigned char>(b[j - 1]));
+      row[j] = std::min({row[j] + 1, row[j - 1] + 1, diagonal + (same ? 0 : 1)});
+      diagonal = up;
+    }
+  }
+  return row[b.size()];
+}
+
+std::string LinkName(const ChildCreation& link) {
+  return std::string(link.LinkName, strnlen(link.LinkName, sizeof link.LinkName));
+}
+
+std::string TypeName(const ChildCreation& link) {
+  return std::string(link.Type.TypeName, strnlen(link.Type.TypeName, sizeof link.Type.TypeName));
+}
+
+// The index of the link a key names: its name, or its index written in digits.
+int FindLink(Qen_Channel* channel, const std::string& key, const DocPath& path) {
+  const bool digits =
+      !key.empty() && key.size() < 6 &&
+      std::all_of(key.begin(), key.end(), [](unsigned char c) { return std::isdigit(c) != 0; });
+  if (digits) {
+    const int index = std::stoi(key);
+    if (channel->GetChildCreation(index) == nullptr)
+      throw SceneError(path, "no link at index " + key + " (this " + TypeNameOf(channel) +
+                                 " has links 0 to " +
+                                 std::to_string(channel->GetChildCreationCount() - 1) + ")");
+    return index;
+  }
+  const int index = channel->FindChildLinkByName(key);
+  if (index >= 0) return index;
+  std::string message = "unknown link for a " + TypeNameOf(channel);
+  std::size_t best = key.size() / 3 + 2;  // close enough to be a slip of the keyboard
+  std::string suggestion;
+  for (int i = 0; i < channel->GetChildCreationCount(); ++i) {
+    const ChildCreation* link = channel->GetChildCreation(i);
+    if (link == nullptr) continue;
+    const std::size_t distance = EditDistance(key, LinkName(*link));
+    if (distance < best) best = distance, suggestion = LinkName(*link);
+  }
+  if (!suggestion.empty()) message += " (did you mean \"" + suggestion + "\"?)";
+  throw SceneError(path, message);
+}
+
+}  // namespace
+
+void SceneBuilder::ConfigureLinks(Qen_Channel* channel, const Json& links, const DocPath& path) {
+  if (!links.is_object()) ThrowExpected(path, "an object of links by name", links);
+  for (const auto& item : links.items()) {
+    const DocPath at = path.Key(item.key());
+    const int index = FindLink(channel, item.key(), at);
+    const ChildCreation& link = *channel->GetChildCreation(index);
+    const bool many = link.LinkPosition == -1;
+    if (many) {
+      channel->ClearChild(index);
+      // One channel may stand alone; several come as a list.
+      if (!item.value().is_array()) {
+        Link(channel, index, ResolveLinkValue(item.value(), at, link.Type.TypeGuid, TypeName(link)),
+             true, at);
+        continue;
+      }
+      for (std::size_t i = 0; i < item.value().size(); ++i)
+        Link(channel, index,
+             ResolveLinkValue(item.value()[i], at.Index(i), link.Type.TypeGuid, TypeName(link)),
+             true, at.Index(i));
+    } else {
+      Link(channel, index, ResolveLinkValue(item.value(), at, link.Type.TypeGuid, TypeName(link)),
+           false, at);
+    }
+  }
+}
+
+void SceneBuilder::Link(Qen_Channel* owner, int index, Qen_Channel* child, bool many,
+                        const DocPath& path) {
+  if (child == nullptr) {
+    if (!many) owner->SetChild(index, nullptr);
+    return;
+  }
+  if (many ? owner->AddChild(index, child) : owner->SetChild(index, child)) return;
+  const ChildCreation& link = *owner->GetChildCreation(index);
+  std::string what = "a " + TypeNameOf(child) + " channel";
+  for (const Scene::NamedChannel& named : scene_->Named)
+    if (named.Channel == child)
+      what = "channel \"" + named.Name + "\", a " + TypeNameOf(child) + ",";
+  throw SceneError(path, what + " cannot be linked here: the link takes a " + TypeName(link));
+}
+
+Qen_Channel* SceneBuilder::NamedChannel(const std::string& name, const DocPath& path,
+                                        const std::string& expected) {
+  if (Qen_Channel* channel = scene_->Find(name)) return channel;
+  if (expected.empty()) throw SceneError(path, "no channel is named \"" + name + "\"");
+  throw SceneError(path,
+                   "expected " + expected + ", got a string (\"" + name + "\" names no channel)");
+}
+
+Qen_Channel* SceneBuilder::ResolveLinkValue(const Json& value, const DocPath& path,
+                                            const GUID& type, const std::string& type_name) {
+  if (value.is_null()) return nullptr;
+  const bool inline_definition = value.is_object() && value.contains("type");
+  if (type == kValueGuid && !value.is_string() && !inline_definition) {
+    const Track<float> track = ReadTrack(value, path, kNumber);
+    auto* channel = static_cast<Qen_ValueChannel*>(CreateByGuid(type, type_name, path));
+    channel->SetValue(track.Sample(0.0));
+    if (track.IsAnimated())
+      scene_->Animators.push_back(
+          [channel, track](double t) { channel->SetValue(track.Sample(t)); });
+    return channel;
+  }
+  if (type == kValueVectorGuid && !value.is_string() && !inline_definition) {
+    const Track<D3DXVECTOR3> track = ReadTrack(value, path, kVector);
+    auto* channel = static_cast<Qen_ValueVectorChannel*>(CreateByGuid(type, type_name, path));
+    channel->SetVector(track.Sample(0.0));
+    if (track.IsAnimated())
+      scene_->Animators.push_back(
+          [channel, track](double t) { channel->SetVector(track.Sample(t)); });
+    return channel;
+  }
+  if (type == kMatrixGuid && !value.is_string() && !inline_definition) {
+    const Track<MatrixValue> track = ReadTrack(value, path, kMatrix);
+    auto* channel = static_cast<Qen_MatrixChannel*>(CreateByGuid(type, type_name, path));
+    channel->SetMatrix(track.Sample(0.0).Matrix);
+    if (track.IsAnimated())
+      scene_->Animators.push_back(
+          [channel, track](double t) { channel->SetMatrix(track.Sample(t).Matrix); });
+    return channel;
+  }
+  if (type == kEnvelopeStorageGuid && value.is_array()) {
+    Qen_Channel* channel = CreateByGuid(type, type_name, path);
+    SetEnvelopeKeys(channel, value, path, "linear");
+    return channel;
+  }
+  if (value.is_string()) {
+    const char* expected = type == kValueGuid             ? "a number"
+                           : type == kValueVectorGuid     ? "a 3-vector [x, y, z]"
+                           : type == kMatrixGuid          ? "a 4x4 matrix or a transform object"
+                           : type == kEnvelopeStorageGuid ? "a list of keys [[x, y], ...]"
+                                                          : "";
+    return NamedChannel(value.get<std::string>(), path, expected);
+  }
+  return ResolveChannel(value, path, type, type_name);
+}
+
+Qen_Channel* SceneBuilder::ResolveChannel(const Json& value, const DocPath& path, const GUID& type,
+                                          const std::string& type_name) {
+  if (value.is_string()) {
+    Qen_Channel* channel = NamedChannel(value.get<std::string>(), path, "");
+    const ChannelType record = channel->GetChannelType();
+    if (!(record.TypeGuid == type) && !(record.BaseTypeGuid == type))
+      throw SceneError(path, "channel \"" + value.get<std::string>() + "\" is a " +
+                                 TypeNameOf(channel) + ", not a " + type_name);
+    return channel;
+  }
+  if (!value.is_object())
+    ThrowExpected(path, "the name of a " + type_name + " channel or a " + type_name + " definition",
+                  value);
+  Qen_Channel* channel;
+  if (const Json* written = Find(value, "type")) {
+    channel = CreateByName(ReadString(*written, path.Key("type")), path.Key("type"));
+  } else {
+    channel = CreateByGuid(type, type_name, path);
+  }
+  Configure(channel, value, path);
+  return channel;
+}
+
+}  // namespace apescene
