@@ -105,6 +105,10 @@ class Tev_AdvancedParticleEmitter : public Tev_DX8_ObjectDataChannel {
   // --- Pool and drawing resources ---
   std::vector<Particle> Particles;
   std::int32_t ParticleCount = 0;
+  // The pool size the last Initialize was asked for (after the cap). Equal to ParticleCount unless
+  // the memory could not be had; the frame driver's re-initialization check compares against it,
+  // so a failed allocation is not retried every frame.
+  std::int32_t RequestedParticleCount = 0;
   bool HardwareParticles = false;
   LocalVertex* LocalVertices = nullptr;
   PointSpriteVertex* PointSpriteVertices = nullptr;

@@ -1,7 +1,173 @@
-// Placeholder bodies until this concern is written; replaced by its owner.
-#include "plugin/advanced_particle_emitter.h"
+// CallChannel: once per host frame, read the links, measure real time, give birth at the birth
+// rate, run the fixed-rate logic steps, blend for drawing, rebuild the vertex data and draw.
+#include <cstdint>
+#include <cstdlib>
+#include <limits>
 
-void Tev_AdvancedParticleEmitter::CallChannel() {}
-void Tev_AdvancedParticleEmitter::EnableActiveTimer(float) {}
-int Tev_AdvancedParticleEmitter::RandInt(int low, int) { return low; }
-void Tev_AdvancedParticleEmitter::RunLogicStep() {}
+#include "host/host_context.h"
+#include "plugin/advanced_particle_emitter.h"
+#include "plugin/link_reading.h"
+#include "plugin/link_table.h"
+
+namespace {
+
+struct ElapsedTime {
+  float Seconds;
+  float Ms;
+};
+
+// The real time since the last working frame; none while paused, but the baseline moves on so
+// that the paused time is never made up afterwards.
+ElapsedTime MeasureElapsed(Tev_AdvancedParticleEmitter& e) {
+  LARGE_INTEGER now{};
+  QueryPerformanceCounter(&now);
+  ElapsedTime elapsed{0.0f, 0.0f};
+  if (!e.Paused) {
+    // The signed difference, wrapping instead of overflowing for a counter at its range's end.
+    const auto ticks =
+        static_cast<std::int64_t>(static_cast<std::uint64_t>(now.QuadPart) -
+                                  static_cast<std::uint64_t>(e.LastCounter.QuadPart));
+    elapsed.Seconds = static_cast<float>(ticks) / e.CounterFrequency;
+    elapsed.Ms = elapsed.Seconds * 1000.0f;
+  }
+  QueryPerformanceCounter(&e.LastCounter);
+  return elapsed;
+}
+
+void AdvanceActiveTimer(Tev_AdvancedParticleEmitter& e, float seconds) {
+  if (!e.ActiveTimerOn) return;
+  e.ActiveTimerElapsed += seconds;
+  if (e.ActiveTimerElapsed > e.ActiveTimerDuration) e.ActiveTimerOn = false;
+}
+
+void RunBirths(Tev_AdvancedParticleEmitter& e, float ms) {
+  // Not above 0 (NaN included): no births, and the bank neither grows nor resets.
+  if (!(e.BirthsPerSecond > 0.0f)) return;
+  e.BirthInterval = 1000.0f / e.BirthsPerSecond;
+  const bool active = IsYes(ValueLink(e, kLinkEmitterActive)->GetValue());
+  if (!active && !e.ActiveTimerOn) return;
+  e.BirthAccumulator += ms;
+  int births = 0;
+  while (e.BirthAccumulator > e.BirthInterval) {
+    e.BirthAccumulator -= e.BirthInterval;
+    e.BirthParticle(births);
+    ++births;
+    if (births > Tev_AdvancedParticleEmitter::kMaximumBirthsPerFrame) {
+      e.ShowOverload("APE: Too many particles created per frame");
+      e.BirthAccumulator = 0.0f;
+      break;
+    }
+  }
+}
+
+// A rate that is not above 0 (0, negative or NaN) runs no logic step: its interval is infinite.
+bool LogicRateUsable(const Tev_AdvancedParticleEmitter& e) {
+  return e.LogicUpdatesPerSecond > 0.0f;
+}
+
+void ReadLogicRate(Tev_AdvancedParticleEmitter& e) {
+  const float rate = ValueLink(e, kLinkLogicUpdatesPerSecond)->GetValue();
+  if (rate == e.LogicUpdatesPerSecond) return;
+  e.LogicUpdatesPerSecond = rate;
+  e.LogicInterval = LogicRateUsable(e) ? 1000.0f / rate : std::numeric_limits<float>::infinity();
+}
+
+void RunLogicSteps(Tev_AdvancedParticleEmitter& e) {
+  if (!LogicRateUsable(e)) return;
+  int steps = 0;
+  while (e.LogicAccumulator > e.LogicInterval) {
+    e.VerticesDirty = false;
+    e.LogicAccumulator -= e.LogicInterval;
+    ++steps;
+    if (steps > Tev_AdvancedParticleEmitter::kMaximumLogicStepsPerFrame) {
+      e.ShowOverload("APE: Too many logic updates per frame");
+      e.LogicAccumulator = 0.0f;
+      break;
+    }
+    e.RunLogicStep();
+  }
+}
+
+// The banked time as a fraction of one logic step, at most 1.
+float BlendFactor(const Tev_AdvancedParticleEmitter& e) {
+  if (!LogicRateUsable(e)) return 0.0f;
+  const float t = e.LogicAccumulator / e.LogicInterval;
+  return t > 1.0f ? 1.0f : t;
+}
+
+bool SimulationLinksPresent(const Tev_AdvancedParticleEmitter& e) {
+  return e.GetChild(kLinkEmitterActive) && e.GetChild(kLinkLogicUpdatesPerSecond) &&
+         e.GetChild(kLinkBirthsPerSecond);
+}
+
+void Simulate(Tev_AdvancedParticleEmitter& e) {
+  e.BirthsPerSecond = ValueLink(e, kLinkBirthsPerSecond)->GetValue() * e.SimulationScaler;
+  const ElapsedTime elapsed = MeasureElapsed(e);
+  AdvanceActiveTimer(e, elapsed.Seconds);
+  RunBirths(e, elapsed.Ms);
+
+  ReadLogicRate(e);
+  // Ageing is per frame in real seconds, for every record.
+  for (int i = 0; i < e.ParticleCount; ++i) e.Particles[i].Age += elapsed.Seconds;
+  e.LogicAccumulator += elapsed.Ms;
+  RunLogicSteps(e);
+
+  e.InterpolateParticles(BlendFactor(e));
+}
+
+void RebuildVerticesAndDraw(Tev_AdvancedParticleEmitter& e) {
+  if (e.VerticesDirty) {
+    if (e.HardwareParticles) {
+      e.UpdatePointSpriteVertexBuffer();
+    } else {
+      e.UpdateLocalVertexBuffer();
+      e.WriteLocalVertexBufferToBaseClass();
+    }
+  }
+  if (e.HardwareParticles)
+    e.RenderPointSprites();
+  else
+    e.RenderSprites();
+}
+
+}  // namespace
+
+void Tev_AdvancedParticleEmitter::CallChannel() {
+  try {
+    if (!Initialized) {
+      Initialize();
+      return;
+    }
+    NewFrame = HostContext->GetFrameCounter() != LastFrameCounter;
+    LastFrameCounter = HostContext->GetFrameCounter();
+    if (!NewFrame) return;
+
+    ReadLinks();
+    if (SimulationLinksPresent(*this)) Simulate(*this);
+    RebuildVerticesAndDraw(*this);
+  } catch (...) {
+    // Nothing may escape into the host; the next frame starts afresh.
+    ShowDebug("APE: frame update failed");
+  }
+}
+
+void Tev_AdvancedParticleEmitter::EnableActiveTimer(float seconds) {
+  ActiveTimerOn = true;
+  ActiveTimerDuration = seconds;
+  ActiveTimerElapsed = 0.0f;
+}
+
+int Tev_AdvancedParticleEmitter::RandInt(int low, int high) {
+  // The range in 64 bits: high - low may not fit an int.
+  const std::int64_t range = static_cast<std::int64_t>(high) - low;
+  if (range <= 1) return low;
+  return static_cast<int>(std::rand() % range + low);
+}
+
+void Tev_AdvancedParticleEmitter::RunLogicStep() {
+  for (int i = 0; i < ParticleCount; ++i) {
+    const std::int32_t steps = Particles[i].PendingSteps;
+    for (std::int32_t k = 0; k < steps; ++k) UpdateParticle(i);
+    Particles[i].PendingSteps = 1;
+  }
+}

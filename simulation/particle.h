@@ -15,9 +15,9 @@ struct Particle {
   std::uint32_t Color = 0;  // A8R8G8B8
   bool Attached = false;
   bool Sliding = false;
-  float SpinSpeed = 0.0f;        // radians per logic step
-  float SpinAngle = 0.0f;        // radians after the last logic step, reset outside +-360
-  float RenderSpinAngle = 0.0f;  // radians, drawn this frame
+  float SpinSpeed = 0.0f;         // radians per logic step
+  float SpinAngle = 0.0f;         // radians after the last logic step, reset outside +-360
+  float RenderSpinAngle = 0.0f;   // radians, drawn this frame
   std::int32_t PendingSteps = 1;  // updates to run in the next logic step
   D3DXVECTOR3 RenderPosition{0.0f, 0.0f, 0.0f};
   D3DXVECTOR3 Velocity{0.0f, 0.0f, 0.0f};  // distance per logic step

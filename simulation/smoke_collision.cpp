@@ -2,4 +2,8 @@
 #include "plugin/advanced_particle_emitter.h"
 
 void Tev_AdvancedParticleEmitter::SmokeCollisionStage(Particle&) {}
-bool Tev_AdvancedParticleEmitter::SmokeCollisionResponse(float, float, float, float, D3DXVECTOR3*, float, D3DXVECTOR3*, D3DXVECTOR3*, D3DXVECTOR3*, D3DXVECTOR3*) { return false; }
+bool Tev_AdvancedParticleEmitter::SmokeCollisionResponse(float, float, float, float, D3DXVECTOR3*,
+                                                         float, D3DXVECTOR3*, D3DXVECTOR3*,
+                                                         D3DXVECTOR3*, D3DXVECTOR3*) {
+  return false;
+}

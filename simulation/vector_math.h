@@ -1,0 +1,29 @@
+// Three-component float32 vector helpers of the particle arithmetic, written out per component so
+// that every result is the float32 result the simulation is defined by.
+#pragma once
+
+#include <cmath>
+
+#include "platform/d3dx_math.h"
+
+namespace sim {
+
+inline constexpr D3DXVECTOR3 kZeroVector{0.0f, 0.0f, 0.0f};
+
+// Square root of the sum of the squared components.
+inline float Length(const D3DXVECTOR3& v) {
+  return std::sqrt(v.x * v.x + v.y * v.y + v.z * v.z);
+}
+
+inline float Dot(const D3DXVECTOR3& a, const D3DXVECTOR3& b) {
+  return a.x * b.x + a.y * b.y + a.z * b.z;
+}
+
+// D3DXVec3Normalize: a zero vector stays zero.
+inline D3DXVECTOR3 Unit(const D3DXVECTOR3& v) {
+  D3DXVECTOR3 out;
+  D3DXVec3Normalize(&out, &v);
+  return out;
+}
+
+}  // namespace sim
