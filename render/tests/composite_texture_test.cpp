@@ -111,6 +111,9 @@ struct SizeCase {
   const char* Name;
   UINT ParticleW, ParticleH, AttachedW, AttachedH;
 };
+void PrintTo(const SizeCase& c, std::ostream* os) {
+  *os << c.Name;
+}
 
 class MismatchedSizeTest : public CompositeTextureTest,
                            public testing::WithParamInterface<SizeCase> {};

@@ -49,6 +49,7 @@ TEST_F(PointSpritesTest, OneParticleMakesATwentyByteDynamicBufferAndDrawsOnePoin
   ASSERT_EQ(vertices.size(), 1u);
   ExpectVertex(vertices[0], {1, 2, 3}, 4.0f, 0x80FF0000);
 
+  TakeCalls();
   Emitter().StreamPointSprites();
   EXPECT_EQ(TakeCalls(), (std::vector<std::string>{
                              Call("SetStreamSource", {0, id, 0, 20}), Call("SetFVF", {0x62}),

@@ -64,6 +64,9 @@ struct BasisCase {
   D3DXVECTOR3 Facing;  // unit direction from the particle to its look-at point
   D3DXVECTOR3 Corners[4];
 };
+void PrintTo(const BasisCase& c, std::ostream* os) {
+  *os << c.Name;
+}
 
 class QuadBasisTest : public QuadBuildingTest, public testing::WithParamInterface<BasisCase> {};
 
@@ -91,6 +94,9 @@ struct BranchCase {
   D3DXVECTOR3 Direction;
   bool RightBranch;  // ax + az < ay
 };
+void PrintTo(const BranchCase& c, std::ostream* os) {
+  *os << c.Name;
+}
 
 class QuadBranchTest : public QuadBuildingTest, public testing::WithParamInterface<BranchCase> {};
 
@@ -172,6 +178,9 @@ struct RowsCase {
   float Top;
   float Bottom;
 };
+void PrintTo(const RowsCase& c, std::ostream* os) {
+  *os << c.Name;
+}
 
 class TextureRowsTest : public QuadBuildingTest, public testing::WithParamInterface<RowsCase> {};
 

@@ -102,6 +102,9 @@ struct PassCase {
   bool Fading;
   Textures Setup;
 };
+void PrintTo(const PassCase& c, std::ostream* os) {
+  *os << c.Name;
+}
 
 class PassCallLogTest : public RenderPassTest, public testing::WithParamInterface<PassCase> {};
 

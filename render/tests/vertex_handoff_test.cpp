@@ -67,6 +67,9 @@ struct MeshCase {
   int Particles;
   D3DFORMAT IndexFormat;
 };
+void PrintTo(const MeshCase& c, std::ostream* os) {
+  *os << c.Particles << " particles";
+}
 
 class MeshSizeTest : public VertexHandoffTest, public testing::WithParamInterface<MeshCase> {};
 
