@@ -1,8 +1,9 @@
 #include "host/multi_collision_manager.h"
 
 #include <limits>
+#include <memory>
 #include <new>
-#include <string>
+#include <type_traits>
 #include <variant>
 #include <vector>
 
@@ -36,6 +37,14 @@ bool IntersectObject(const CollisionObject& object, const CollisionSegment& segm
           return IntersectFrontFace(shape, segment, max_t, hit);
       },
       object);
+}
+
+void ReportRebuildFailure(Qen_HostContext* context) noexcept {
+  if (!context) return;
+  try {
+    context->DebugMessages("MultiCollisionManager: collision objects not rebuilt");
+  } catch (...) {
+  }
 }
 
 }  // namespace
@@ -105,14 +114,9 @@ void Tev_MultiCollisionManager::RebuildAllCollisionObjects() {
       if (auto* mesh = std::get_if<MeshObject>(&impl_->CodeObjects[i]))
         mesh->Mesh = std::move(code_meshes[i]);
     impl_->LinkedObjects = std::move(linked);
-  } catch (const std::exception& error) {
-    if (HostContext)
-      HostContext->DebugMessages(
-          (std::string("MultiCollisionManager: collision objects not rebuilt: ") + error.what())
-              .c_str());
   } catch (...) {
-    if (HostContext)
-      HostContext->DebugMessages("MultiCollisionManager: collision objects not rebuilt");
+    // Whatever went wrong (memory, or a mesh channel that threw), the emitter must not see it.
+    ReportRebuildFailure(HostContext);
   }
 }
 

@@ -6,6 +6,8 @@
 #include <algorithm>
 #include <cmath>
 #include <cstdlib>
+#include <stdexcept>
+#include <string>
 #include <utility>
 #include <vector>
 
@@ -220,6 +222,34 @@ TEST_F(CollisionMeshTest, MovingTheMeshAndRebuildingMovesTheHits) {
   ASSERT_EQ(Query(manager_, {10, 5, 0}, {0, -10, 0}, &point), 1);
   EXPECT_NEAR(point.y, 3.0f, kTolerance);
   EXPECT_EQ(Query(manager_, {0, 1, 0}, {0, -2, 0}), -1);  // nothing left at the old height
+}
+
+// A mesh channel whose vertices cannot be read.
+class BrokenMesh : public Tev_DX8_ObjectDataChannel {
+ public:
+  D3DXVECTOR3 GetVertexPosition(DWORD) override { throw std::runtime_error("unreadable"); }
+};
+
+// A failed rebuild leaves the objects as they were and says so; nothing reaches the caller.
+TEST_F(CollisionMeshTest, FailedRebuildKeepsTheObjectsAndReports) {
+  std::vector<std::string> messages;
+  context_.DebugMessages.SetSink([&](const char* text) { messages.emplace_back(text); });
+  Tev_DX8_ObjectDataChannel quad;
+  quad.BuildQuad(2.0f, 2.0f);
+  ASSERT_TRUE(manager_.AddChild(Tev_MultiCollisionManager::kLinkCollisionObjects, &quad));
+  manager_.RebuildAllCollisionObjects();
+  ASSERT_EQ(manager_.GetObjectCount(), 1);
+  EXPECT_TRUE(messages.empty());
+
+  BrokenMesh broken;
+  broken.BuildQuad(2.0f, 2.0f);
+  ASSERT_TRUE(manager_.AddChild(Tev_MultiCollisionManager::kLinkCollisionObjects, &broken));
+  EXPECT_NO_THROW(manager_.RebuildAllCollisionObjects());
+  EXPECT_EQ(manager_.GetObjectCount(), 1);
+  EXPECT_EQ(Query(manager_, {0, 1, 0}, {0, -2, 0}), 0);
+  ASSERT_EQ(messages.size(), 1u);
+  EXPECT_NE(messages[0].find("not rebuilt"), std::string::npos);
+  EXPECT_EQ(manager_.AddMesh(&broken), -1);  // refused, not thrown
 }
 
 // A large mesh: the closest of many stacked layers, with ids of the objects around it intact.
