@@ -1,0 +1,97 @@
+#include "platform/gl/tests/gl_test_device.h"
+
+#include <cstdlib>
+#include <cstring>
+
+Argb Channels(std::uint32_t pixel) {
+  return Argb{static_cast<int>(pixel >> 24), static_cast<int>((pixel >> 16) & 0xFF),
+              static_cast<int>((pixel >> 8) & 0xFF), static_cast<int>(pixel & 0xFF)};
+}
+
+::testing::AssertionResult PixelNear(std::uint32_t actual, std::uint32_t expected, int tolerance) {
+  const Argb a = Channels(actual);
+  const Argb e = Channels(expected);
+  if (std::abs(a.a - e.a) <= tolerance && std::abs(a.r - e.r) <= tolerance &&
+      std::abs(a.g - e.g) <= tolerance && std::abs(a.b - e.b) <= tolerance) {
+    return ::testing::AssertionSuccess();
+  }
+  char text[96];
+  std::snprintf(text, sizeof text, "pixel %08X, expected %08X (+-%d per channel)", actual, expected,
+                tolerance);
+  return ::testing::AssertionFailure() << text;
+}
+
+void GlDeviceTest::SetUp() {
+  std::string error;
+  device_ = GlDevice::Create(kSize, kSize, &error);
+  if (device_ == nullptr) GTEST_SKIP() << "no OpenGL context on this machine: " << error;
+}
+
+void GlDeviceTest::TearDown() {
+  for (IUnknown* object : owned_) object->Release();
+  owned_.clear();
+  if (device_ != nullptr) {
+    EXPECT_EQ(device_->LiveObjectCount(), 0);
+    device_->Release();
+  }
+}
+
+IDirect3DVertexBuffer9* GlDeviceTest::Upload(const void* vertices, UINT bytes, UINT stride,
+                                             DWORD fvf) {
+  IDirect3DVertexBuffer9* buffer = nullptr;
+  EXPECT_EQ(device_->CreateVertexBuffer(bytes, D3DUSAGE_WRITEONLY, fvf, D3DPOOL_MANAGED, &buffer,
+                                        nullptr),
+            S_OK);
+  if (buffer == nullptr) return nullptr;
+  owned_.push_back(buffer);
+  void* data = nullptr;
+  EXPECT_EQ(buffer->Lock(0, bytes, &data, 0), S_OK);
+  std::memcpy(data, vertices, bytes);
+  EXPECT_EQ(buffer->Unlock(), S_OK);
+  EXPECT_EQ(device_->SetStreamSource(0, buffer, 0, stride), S_OK);
+  EXPECT_EQ(device_->SetFVF(fvf), S_OK);
+  return buffer;
+}
+
+IDirect3DTexture9* GlDeviceTest::MakeTexture(UINT width, UINT height,
+                                             const std::vector<D3DCOLOR>& texels) {
+  IDirect3DTexture9* texture = nullptr;
+  EXPECT_EQ(device_->CreateTexture(width, height, 1, 0, D3DFMT_A8R8G8B8, D3DPOOL_MANAGED, &texture,
+                                   nullptr),
+            S_OK);
+  if (texture == nullptr) return nullptr;
+  owned_.push_back(texture);
+  D3DLOCKED_RECT locked{};
+  EXPECT_EQ(texture->LockRect(0, &locked, nullptr, 0), S_OK);
+  for (UINT y = 0; y < height; ++y) {
+    std::memcpy(static_cast<BYTE*>(locked.pBits) + std::size_t(y) * locked.Pitch,
+                texels.data() + std::size_t(y) * width, width * sizeof(D3DCOLOR));
+  }
+  EXPECT_EQ(texture->UnlockRect(0), S_OK);
+  return texture;
+}
+
+void GlDeviceTest::Unlit() {
+  ASSERT_EQ(device_->SetRenderState(D3DRS_LIGHTING, FALSE), S_OK);
+}
+
+void GlDeviceTest::Read() {
+  device_->ReadPixels(&pixels_);
+  ASSERT_EQ(pixels_.size(), std::size_t{kSize} * kSize);
+}
+
+std::uint32_t GlDeviceTest::Pixel(int x, int y) const {
+  return pixels_.at(static_cast<std::size_t>(y) * kSize + static_cast<std::size_t>(x));
+}
+
+int GlDeviceTest::CountNear(std::uint32_t colour, int tolerance) const {
+  int count = 0;
+  for (std::uint32_t p : pixels_) count += PixelNear(p, colour, tolerance) ? 1 : 0;
+  return count;
+}
+
+std::vector<ColouredVertex> Quad(float x0, float y0, float x1, float y1, float z, D3DCOLOR colour) {
+  // Clockwise as seen, so that Direct3D's default culling keeps it.
+  return {{x0, y1, z, colour}, {x1, y1, z, colour}, {x1, y0, z, colour},
+          {x0, y1, z, colour}, {x1, y0, z, colour}, {x0, y0, z, colour}};
+}
