@@ -43,7 +43,7 @@ void BM_EnvelopeValue(benchmark::State& state) {
     next = (next + 1) % xs.size();
   }
 }
-BENCHMARK(BM_EnvelopeValue)->ArgsProduct({{8, 64}, {1, 0}})->ArgNames({"keys", "even"});
+BENCHMARK(BM_EnvelopeValue)->ArgsProduct({{8, 64, 1024}, {1, 0}})->ArgNames({"keys", "even"});
 
 struct Query {
   D3DXVECTOR3 Origin;
