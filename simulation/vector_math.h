@@ -26,4 +26,11 @@ inline D3DXVECTOR3 Unit(const D3DXVECTOR3& v) {
   return out;
 }
 
+// `point` moved along the unit `normal` onto the plane through `onPlane`.
+inline D3DXVECTOR3 ProjectOntoPlane(const D3DXVECTOR3& point, const D3DXVECTOR3& onPlane,
+                                    const D3DXVECTOR3& normal) {
+  const float distance = Dot(normal, point) - Dot(normal, onPlane);
+  return point - normal * distance;
+}
+
 }  // namespace sim
