@@ -23,8 +23,8 @@ double MsSince(Clock::time_point start) {
 // Device states the mesh pass changes, put back afterwards so that the emitters find the
 // device as they left it.
 struct SavedStates {
-  static constexpr D3DRENDERSTATETYPE kRender[] = {D3DRS_LIGHTING, D3DRS_ALPHABLENDENABLE,
-                                                   D3DRS_ZENABLE, D3DRS_ZWRITEENABLE};
+  static constexpr D3DRENDERSTATETYPE kRender[] = {D3DRS_ALPHABLENDENABLE, D3DRS_ZENABLE,
+                                                   D3DRS_ZWRITEENABLE, D3DRS_CULLMODE};
   static constexpr D3DTEXTURESTAGESTATETYPE kStage[] = {D3DTSS_COLOROP, D3DTSS_COLORARG1,
                                                         D3DTSS_ALPHAOP, D3DTSS_ALPHAARG1};
   DWORD Render[4];
@@ -83,6 +83,9 @@ FrameResult SceneRenderer::RenderFrame(int frame) {
   const D3DVIEWPORT9 viewport{0,    0,   static_cast<DWORD>(width_), static_cast<DWORD>(height_),
                               0.0f, 1.0f};
   device->SetViewport(&viewport);
+  // The scene has no lights: everything shows its vertex colours. (Direct3D lights by default,
+  // which without lights draws black, and the emitter's blended passes leave lighting alone.)
+  device->SetRenderState(D3DRS_LIGHTING, FALSE);
   const D3DXMATRIX view = apescene::CameraView(scene_.View, result.Seconds);
   const D3DXMATRIX projection = apescene::CameraProjection(scene_.View, width_, height_);
   device->SetTransform(D3DTS_VIEW, &view);
@@ -120,9 +123,9 @@ void SceneRenderer::DrawMeshes() {
     device->GetRenderState(SavedStates::kRender[i], &saved.Render[i]);
     device->GetTextureStageState(0, SavedStates::kStage[i], &saved.Stage[i]);
   }
-  // Opaque, unlit, vertex colour only.
-  device->SetRenderState(D3DRS_LIGHTING, FALSE);
+  // Opaque, vertex colour only, seen from both sides (a wall or an OBJ may face away).
   device->SetRenderState(D3DRS_ALPHABLENDENABLE, FALSE);
+  device->SetRenderState(D3DRS_CULLMODE, D3DCULL_NONE);
   device->SetRenderState(D3DRS_ZENABLE, D3DZB_TRUE);
   device->SetRenderState(D3DRS_ZWRITEENABLE, TRUE);
   device->SetTextureStageState(0, D3DTSS_COLOROP, D3DTOP_SELECTARG1);
