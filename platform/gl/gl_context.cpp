@@ -6,8 +6,8 @@
 #include "platform/gl/gl_api.h"
 
 #include <cstring>
-#include <map>
 #include <mutex>
+#include <set>
 
 #include "platform/d3d9_types.h"
 
@@ -18,40 +18,18 @@ struct GlContext::Egl {
 
 namespace {
 
-// eglTerminate ends a display for every context on it, and EGL hands out one display per
-// platform and device, so displays are counted here and terminated with their last context.
-std::mutex& DisplayMutex() {
+// A display, once initialised, stays so for the life of the process: initialising is slow,
+// eglTerminate would end it for every other device on the same display too, and Mesa leaves a
+// little of its driver state behind on each terminate-and-initialise cycle.
+bool InitialiseDisplay(EGLDisplay display) {
   static std::mutex mutex;
-  return mutex;
-}
-std::map<EGLDisplay, int>& DisplayUsers() {
-  static std::map<EGLDisplay, int> users;
-  return users;
-}
-
-bool AcquireDisplay(EGLDisplay display) {
-  std::lock_guard<std::mutex> lock(DisplayMutex());
-  int& users = DisplayUsers()[display];
-  if (users == 0) {
-    EGLint major = 0, minor = 0;
-    if (!eglInitialize(display, &major, &minor)) {
-      DisplayUsers().erase(display);
-      return false;
-    }
-  }
-  ++users;
+  static std::set<EGLDisplay> initialised;
+  std::lock_guard<std::mutex> lock(mutex);
+  if (initialised.count(display) != 0) return true;
+  EGLint major = 0, minor = 0;
+  if (!eglInitialize(display, &major, &minor)) return false;
+  initialised.insert(display);
   return true;
-}
-
-void ReleaseDisplay(EGLDisplay display) {
-  std::lock_guard<std::mutex> lock(DisplayMutex());
-  auto it = DisplayUsers().find(display);
-  if (it == DisplayUsers().end()) return;
-  if (--it->second == 0) {
-    DisplayUsers().erase(it);
-    eglTerminate(display);
-    eglReleaseThread();
-  }
 }
 
 bool HasExtension(const char* list, const char* name) {
@@ -88,9 +66,9 @@ EGLContext MakeContext(EGLDisplay display) {
   return eglCreateContext(display, config, EGL_NO_CONTEXT, attributes);
 }
 
-// Tries one display: initialise, make a context, make it current. False leaves nothing behind.
+// Tries one display: initialise, make a context, make it current.
 bool TryDisplay(EGLDisplay display, GlContext::Egl* egl) {
-  if (display == EGL_NO_DISPLAY || !AcquireDisplay(display)) return false;
+  if (display == EGL_NO_DISPLAY || !InitialiseDisplay(display)) return false;
   EGLContext context = MakeContext(display);
   if (context != EGL_NO_CONTEXT &&
       eglMakeCurrent(display, EGL_NO_SURFACE, EGL_NO_SURFACE, context)) {
@@ -99,7 +77,6 @@ bool TryDisplay(EGLDisplay display, GlContext::Egl* egl) {
     return true;
   }
   if (context != EGL_NO_CONTEXT) eglDestroyContext(display, context);
-  ReleaseDisplay(display);
   return false;
 }
 
@@ -235,7 +212,6 @@ GlContext::~GlContext() {
   if (depth_buffer_ != 0) glDeleteRenderbuffers(1, &depth_buffer_);
   eglMakeCurrent(egl_->display, EGL_NO_SURFACE, EGL_NO_SURFACE, EGL_NO_CONTEXT);
   eglDestroyContext(egl_->display, egl_->context);
-  ReleaseDisplay(egl_->display);
 }
 
 void GlContext::MakeCurrent() {
