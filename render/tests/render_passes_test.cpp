@@ -218,18 +218,6 @@ TEST_F(RenderPassTest, FadingPointPassRestoresBlendingAndLeavesDepthWritesAlone)
   EXPECT_EQ(device_->RenderState(D3DRS_POINTSCALE_C), FloatToStateBits(1.0f));
 }
 
-TEST_F(RenderPassTest, PointPassWithoutABufferSetsStatesButDrawsNothing) {
-  SetPool({Particle{}});
-  device_->FailNextCreateVertexBuffer();
-  Emitter().InitializePointSpriteVertexBuffer();
-  TakeCalls();
-  Emitter().RenderPointSprites();
-  for (const std::string& call : TakeCalls()) {
-    EXPECT_EQ(call.rfind("Draw", 0), std::string::npos) << call;
-    EXPECT_EQ(call.rfind("SetStreamSource", 0), std::string::npos) << call;
-  }
-}
-
 TEST_F(RenderPassTest, SwitchedOffBaseOperationsTouchNothing) {
   SetUpPath(Path::Quads);
   TakeCalls();
