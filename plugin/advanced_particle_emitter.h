@@ -124,7 +124,9 @@ class Tev_AdvancedParticleEmitter : public Tev_DX8_ObjectDataChannel {
   bool NewFrame = false;
   float CounterFrequency = 0.0f;  // ticks per second
   LARGE_INTEGER LastCounter{};
-  float SimulationScaler = 0.0f;
+  // 1 until a frame reads "Simulation Scaler", so that a birth requested before any frame
+  // (BirthParticle is public) does not divide by zero.
+  float SimulationScaler = 1.0f;
   bool Paused = false;
   float BirthsPerSecond = 0.0f;
   float BirthInterval = 0.0f;     // ms

@@ -22,6 +22,7 @@ Tev_AdvancedParticleEmitter& Tev_AdvancedParticleEmitter::operator=(
 void Tev_AdvancedParticleEmitter::CopySettingsFrom(const Tev_AdvancedParticleEmitter& o) {
   Particles = o.Particles;
   ParticleCount = o.ParticleCount;
+  RequestedParticleCount = o.RequestedParticleCount;
   HardwareParticles = o.HardwareParticles;
   HasCompositeTexture = false;
   DeviceChannel = o.DeviceChannel;
