@@ -94,7 +94,14 @@ FrameResult SceneRenderer::RenderFrame(int frame) {
 
   device_.Device()->ResetTimes();
   const Clock::time_point calls = Clock::now();
-  for (const auto& channel : scene_.Channels) channel->CallChannel();
+  for (const auto& channel : scene_.Channels) {
+    // Blended particles are tested against the depth of what is drawn but do not write it, as
+    // hosts draw transparent effects; otherwise each quad's clear corners would hide the
+    // particles behind it. The emitter turns depth writing back on after its pass, so this is
+    // set again before each channel.
+    device->SetRenderState(D3DRS_ZWRITEENABLE, FALSE);
+    channel->CallChannel();
+  }
   result.ChannelMs = MsSince(calls);
   result.DrawMs = device_.Device()->DrawMs();
 

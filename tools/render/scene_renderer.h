@@ -2,7 +2,7 @@
 // the test clock by 1/fps (rounded to whole clock ticks without drift) and the host context by
 // one frame, updates the animated values, then clears, sets the camera, draws the visible
 // meshes, calls every channel (emitters simulate and draw inside CallChannel) and reads the
-// picture back.
+// picture back. The device is unlit, and channels draw without depth writes (see RenderFrame).
 #pragma once
 
 #include <cstdint>
