@@ -16,9 +16,10 @@ int HexValue(char c) {
 }
 
 // A colour component 0..1 as a byte, rounded.
-std::uint32_t UnitToByte(float unit, const DocPath& path) {
+std::uint32_t UnitToByte(const Json& value, const DocPath& path) {
+  const float unit = ReadNumber(value, path);
   if (unit < 0.0f || unit > 1.0f)
-    throw SceneError(path, "expected a colour component from 0 to 1, got " + std::to_string(unit));
+    throw SceneError(path, "expected a colour component from 0 to 1, got " + value.dump());
   return static_cast<std::uint32_t>(std::lround(unit * 255.0f));
 }
 
@@ -139,8 +140,7 @@ D3DCOLOR ReadColor(const Json& value, const DocPath& path) {
   if (!value.is_array() || (value.size() != 3 && value.size() != 4))
     ThrowExpected(path, what, value);
   std::uint32_t c[4] = {0, 0, 0, 255};
-  for (std::size_t i = 0; i < value.size(); ++i)
-    c[i] = UnitToByte(ReadNumber(value[i], path.Index(i)), path.Index(i));
+  for (std::size_t i = 0; i < value.size(); ++i) c[i] = UnitToByte(value[i], path.Index(i));
   return D3DCOLOR_ARGB(c[3], c[0], c[1], c[2]);
 }
 

@@ -50,14 +50,14 @@ int FindLink(Qen_Channel* channel, const std::string& key, const DocPath& path) 
   if (digits) {
     const int index = std::stoi(key);
     if (channel->GetChildCreation(index) == nullptr)
-      throw SceneError(path, "no link at index " + key + " (this " + TypeNameOf(channel) +
+      throw SceneError(path, "no link at index " + key + " (" + TypeNameOf(channel) +
                                  " has links 0 to " +
                                  std::to_string(channel->GetChildCreationCount() - 1) + ")");
     return index;
   }
   const int index = channel->FindChildLinkByName(key);
   if (index >= 0) return index;
-  std::string message = "unknown link for a " + TypeNameOf(channel);
+  std::string message = "unknown link name for " + TypeNameOf(channel);
   std::size_t best = key.size() / 3 + 2;  // close enough to be a slip of the keyboard
   std::string suggestion;
   for (int i = 0; i < channel->GetChildCreationCount(); ++i) {
@@ -106,11 +106,11 @@ void SceneBuilder::Link(Qen_Channel* owner, int index, Qen_Channel* child, bool 
   }
   if (many ? owner->AddChild(index, child) : owner->SetChild(index, child)) return;
   const ChildCreation& link = *owner->GetChildCreation(index);
-  std::string what = "a " + TypeNameOf(child) + " channel";
+  std::string what = "a channel (" + TypeNameOf(child) + ")";
   for (const Scene::NamedChannel& named : scene_->Named)
-    if (named.Channel == child)
-      what = "channel \"" + named.Name + "\", a " + TypeNameOf(child) + ",";
-  throw SceneError(path, what + " cannot be linked here: the link takes a " + TypeName(link));
+    if (named.Channel == child) what = "channel \"" + named.Name + "\" (" + TypeNameOf(child) + ")";
+  throw SceneError(path,
+                   what + " cannot be linked here: the link takes " + TypeName(link) + " channels");
 }
 
 Qen_Channel* SceneBuilder::NamedChannel(const std::string& name, const DocPath& path,
@@ -174,8 +174,8 @@ Qen_Channel* SceneBuilder::ResolveChannel(const Json& value, const DocPath& path
     Qen_Channel* channel = NamedChannel(value.get<std::string>(), path, "");
     const ChannelType record = channel->GetChannelType();
     if (!(record.TypeGuid == type) && !(record.BaseTypeGuid == type))
-      throw SceneError(path, "channel \"" + value.get<std::string>() + "\" is a " +
-                                 TypeNameOf(channel) + ", not a " + type_name);
+      throw SceneError(path, "channel \"" + value.get<std::string>() + "\" (" +
+                                 TypeNameOf(channel) + ") is not a " + type_name + " channel");
     return channel;
   }
   if (!value.is_object())

@@ -91,10 +91,11 @@ bool LoadObjMesh(const std::string& path, Tev_DX8_ObjectDataChannel* mesh, std::
       }
       if (!has_normals) {
         const D3DXVECTOR3 n =
-            FaceNormal(triangle[0].Position, triangle[1].Position, triangle[2].Position);
+            FaceNormal(triangle[0].Position, triangle[2].Position, triangle[1].Position);
         for (MeshVertex& v : triangle) v.Normal = n;
       }
-      vertices.insert(vertices.end(), triangle, triangle + 3);
+      // Reversed winding: see the header.
+      vertices.insert(vertices.end(), {triangle[0], triangle[2], triangle[1]});
       offset += 3;
     }
   }

@@ -11,9 +11,10 @@ class Tev_DX8_ObjectDataChannel;
 namespace apescene {
 
 // Replaces the mesh with the triangles of an OBJ file (polygons are triangulated). OBJ files are
-// right-handed (y up, z toward the viewer) and this host is left-handed, so z is negated, which
-// also keeps the file's counter-clockwise front faces in front. Without normals in the file each
-// triangle gets its face normal. False with a message naming the file.
+// right-handed (y up, z toward the viewer) with counter-clockwise front faces; this host is
+// left-handed with clockwise front faces, so z is negated and each triangle's winding reversed,
+// which keeps the file's front faces in front. Without normals in the file each triangle gets
+// its face normal. False with a message naming the file.
 bool LoadObjMesh(const std::string& path, Tev_DX8_ObjectDataChannel* mesh, std::string* error);
 
 // A width x depth grid in the XZ plane facing +Y, centred on the origin, of cells x cells
