@@ -223,6 +223,54 @@ INSTANTIATE_TEST_SUITE_P(
         StageCase{"Add", D3DTOP_ADD, D3DTA_TEXTURE, D3DTA_DIFFUSE, 0xFF80FF80}),
     [](const auto& info) { return std::string(info.param.name); });
 
+struct BlendCase {
+  const char* name;
+  DWORD source, destination, op;
+  D3DCOLOR over;      // drawn over 0xFF408020
+  D3DCOLOR expected;  // rgb only: the target's alpha is not checked
+};
+
+class GlBlendTest : public GlDrawTest, public ::testing::WithParamInterface<BlendCase> {};
+
+TEST_P(GlBlendTest, FactorsAndOperationCombineSourceAndTarget) {
+  const BlendCase& c = GetParam();
+  Unlit();
+  ClearTo(0xFF408020);
+  ASSERT_EQ(device_->SetRenderState(D3DRS_ALPHABLENDENABLE, TRUE), S_OK);
+  ASSERT_EQ(device_->SetRenderState(D3DRS_SRCBLEND, c.source), S_OK);
+  ASSERT_EQ(device_->SetRenderState(D3DRS_DESTBLEND, c.destination), S_OK);
+  ASSERT_EQ(device_->SetRenderState(D3DRS_BLENDOP, c.op), S_OK);
+  DrawList(Quad(-1, -1, 1, 1, 0.5f, c.over));
+  Read();
+  EXPECT_TRUE(PixelNear(Pixel(32, 32) | 0xFF000000, c.expected | 0xFF000000));
+}
+
+INSTANTIATE_TEST_SUITE_P(Blending, GlBlendTest,
+                         ::testing::Values(BlendCase{"Additive", D3DBLEND_ONE, D3DBLEND_ONE,
+                                                     D3DBLENDOP_ADD, 0xFF204010, 0x60C030},
+                                           BlendCase{"Multiply", D3DBLEND_DESTCOLOR, D3DBLEND_ZERO,
+                                                     D3DBLENDOP_ADD, 0xFF808080, 0x204010},
+                                           BlendCase{"AlphaAdditive", D3DBLEND_SRCALPHA,
+                                                     D3DBLEND_ONE, D3DBLENDOP_ADD, 0x80FFFFFF,
+                                                     0xC0FFA0},
+                                           BlendCase{"ReverseSubtract", D3DBLEND_ONE, D3DBLEND_ONE,
+                                                     3 /* REVSUBTRACT */, 0xFF200010, 0x208010}),
+                         [](const auto& info) { return std::string(info.param.name); });
+
+TEST_F(GlDrawTest, AlphaTestDropsFragmentsThatFailTheReference) {
+  Unlit();
+  ClearTo(kBlack);
+  ASSERT_EQ(device_->SetRenderState(D3DRS_ALPHATESTENABLE, TRUE), S_OK);
+  ASSERT_EQ(device_->SetRenderState(D3DRS_ALPHAREF, 0x80), S_OK);
+  ASSERT_EQ(device_->SetRenderState(D3DRS_ALPHAFUNC, D3DCMP_GREATER), S_OK);
+  std::vector<ColouredVertex> pair = Quad(-1, -1, 0, 1, 0.5f, 0x40FF0000);
+  for (const ColouredVertex& v : Quad(0, -1, 1, 1, 0.5f, 0xC000FF00)) pair.push_back(v);
+  DrawList(pair);
+  Read();
+  EXPECT_TRUE(PixelNear(Pixel(16, 32), kBlack));
+  EXPECT_TRUE(PixelNear(Pixel(48, 32), 0xC000FF00));
+}
+
 TEST_F(GlDrawTest, WithoutATextureTheDiffuseColourPassesThrough) {
   Unlit();
   ClearTo(kBlack);
