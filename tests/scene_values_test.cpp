@@ -3,6 +3,7 @@
 
 #include <cmath>
 #include <fstream>
+#include <sstream>
 
 #include "host/attractor.h"
 #include "host/envelope_storage.h"
@@ -390,6 +391,21 @@ TEST_F(SceneValueTest, CommentsAreAllowedAndLinesStillCount) {
   const std::string error =
       host_.ErrorOf("{\n// a comment\n/* a block\ncomment */ \"fps\": \"fast\"}");
   EXPECT_EQ(error, "test.json:4: fps: expected a number, got a string");
+}
+
+TEST_F(SceneValueTest, TheDocumentedExampleLoads) {
+  std::ifstream doc(std::string(APE_SOURCE_DIR) + "/docs/scene-format.md");
+  std::stringstream text;
+  text << doc.rdbuf();
+  const std::string markdown = text.str();
+  const std::string start = "## A complete example\n\n```json\n";
+  const std::size_t begin = markdown.find(start);
+  ASSERT_NE(begin, std::string::npos);
+  const std::size_t end = markdown.find("```", begin + start.size());
+  Load(markdown.substr(begin + start.size(), end - begin - start.size()));
+  ASSERT_NE(scene_, nullptr);
+  EXPECT_NE(scene_->Find("sparks"), nullptr);
+  EXPECT_EQ(scene_->Settings.FrameCount(), 90);
 }
 
 }  // namespace

@@ -1,0 +1,365 @@
+// The pieces of a render: choosing and laying out contact-sheet frames, shrinking pictures, the
+// GIF palette and file, progress texts, the statistics table and the particle census.
+#include <gif_lib.h>
+#include <gtest/gtest.h>
+
+#include <filesystem>
+#include <fstream>
+
+#include "host/host_context.h"
+#include "platform/memory_device.h"
+#include "plugin/advanced_particle_emitter.h"
+#include "tests/scene_test_host.h"
+#include "tools/render/contact_sheet.h"
+#include "tools/render/gif_writer.h"
+#include "tools/render/particle_census.h"
+#include "tools/render/progress.h"
+#include "tools/render/render_output.h"
+#include "tools/render/stats_table.h"
+#include "tools/render/timing_device.h"
+#include "tools/scene/png_io.h"
+
+namespace scenetest {
+namespace {
+
+using apescene::Image;
+
+Image Filled(int width, int height, std::uint32_t argb) {
+  return Image{width, height,
+               std::vector<std::uint32_t>(static_cast<std::size_t>(width * height), argb)};
+}
+
+struct SheetFramesCase {
+  int Frames;
+  int Cells;
+  std::vector<int> Expected;
+};
+
+class ContactSheetFramesTest : public ::testing::TestWithParam<SheetFramesCase> {};
+
+TEST_P(ContactSheetFramesTest, EvenlySpacedEndingOnTheLast) {
+  EXPECT_EQ(aperender::ContactSheetFrames(GetParam().Frames, GetParam().Cells),
+            GetParam().Expected);
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Counts, ContactSheetFramesTest,
+    ::testing::Values(SheetFramesCase{120, 12, {10, 20, 30, 40, 50, 60, 70, 80, 90, 100, 110, 120}},
+                      SheetFramesCase{5, 12, {1, 2, 3, 4, 5}}, SheetFramesCase{1, 12, {1}},
+                      SheetFramesCase{10, 4, {3, 5, 8, 10}},
+                      SheetFramesCase{36, 4, {9, 18, 27, 36}}));
+
+TEST(ContactSheetTest, LaysPicturesOutInRowsWithGaps) {
+  const std::vector<Image> pictures = {Filled(3, 2, 0xFF0000FFu), Filled(3, 2, 0xFF00FF00u),
+                                       Filled(3, 2, 0xFFFF0000u)};
+  const Image sheet = aperender::BuildContactSheet(pictures, 2, 1, 0xFF000000u);
+  ASSERT_EQ(sheet.Width, 2 * 3 + 3);
+  ASSERT_EQ(sheet.Height, 2 * 2 + 3);
+  auto at = [&](int x, int y) { return sheet.Argb[static_cast<std::size_t>(y * sheet.Width + x)]; };
+  EXPECT_EQ(at(0, 0), 0xFF000000u);  // gap
+  EXPECT_EQ(at(1, 1), 0xFF0000FFu);  // first, top left
+  EXPECT_EQ(at(5, 2), 0xFF00FF00u);  // second, top right
+  EXPECT_EQ(at(1, 4), 0xFFFF0000u);  // third, next row
+  EXPECT_EQ(at(5, 4), 0xFF000000u);  // no fourth picture
+}
+
+TEST(ShrinkTest, AveragesBoxesOfAWholeFactor) {
+  Image image = Filled(4, 2, 0xFF000000u);
+  image.Argb[0] = 0xFFFFFFFFu;  // one white pixel of the first 2 x 2 box
+  const Image small = apescene::ShrinkToWidth(image, 2);
+  ASSERT_EQ(small.Width, 2);
+  ASSERT_EQ(small.Height, 1);
+  EXPECT_EQ(small.Argb[0], 0xFF404040u);  // 255 / 4, rounded
+  EXPECT_EQ(small.Argb[1], 0xFF000000u);
+  EXPECT_EQ(apescene::ShrinkToWidth(image, 4).Argb, image.Argb);    // already fits
+  EXPECT_EQ(apescene::ShrinkToWidth(Filled(7, 3, 0), 3).Width, 2);  // factor 3
+}
+
+TEST(PngTest, RoundTripKeepsPixels) {
+  TempFolder folder;
+  const Image image{2, 2, {0xFF010203u, 0xFFFFFFFFu, 0xFF000000u, 0xFF808080u}};
+  std::string error;
+  ASSERT_TRUE(apescene::WritePng(folder.File("a.png"), image, false, &error)) << error;
+  Image back;
+  ASSERT_TRUE(apescene::ReadPng(folder.File("a.png"), &back, &error)) << error;
+  EXPECT_EQ(back.Argb, image.Argb);
+  EXPECT_FALSE(apescene::WritePng(folder.File("no/such/folder.png"), image, false, &error));
+}
+
+struct PaletteCase {
+  std::uint32_t Argb;
+  int Index;
+};
+
+class GifPaletteTest : public ::testing::TestWithParam<PaletteCase> {};
+
+TEST_P(GifPaletteTest, ExactCubeColoursNeedNoDither) {
+  // A colour on the cube keeps its index at every dither position.
+  for (int y = 0; y < 4; ++y)
+    for (int x = 0; x < 4; ++x)
+      EXPECT_EQ(aperender::GifWriter::PaletteIndex(GetParam().Argb, x, y), GetParam().Index);
+}
+
+INSTANTIATE_TEST_SUITE_P(Cube, GifPaletteTest,
+                         ::testing::Values(PaletteCase{0xFF000000u, 0},
+                                           PaletteCase{0xFFFFFFFFu, 251},
+                                           PaletteCase{0xFFFF0000u, 5 * 42},
+                                           PaletteCase{0xFF0000FFu, 5},
+                                           PaletteCase{0xFF00FF00u, 6 * 6}));
+
+TEST(GifPaletteTest, InBetweenGreyDithersBetweenNeighbours) {
+  // Half way between two red levels: some positions round up, some down.
+  const std::uint32_t grey = 0xFF000000u | (25u << 16);  // red level 0.49 of a step
+  int up = 0;
+  for (int y = 0; y < 4; ++y)
+    for (int x = 0; x < 4; ++x) up += aperender::GifWriter::PaletteIndex(grey, x, y) != 0;
+  EXPECT_GT(up, 4);
+  EXPECT_LT(up, 12);
+}
+
+TEST(GifWriterTest, WritesALoopingAnimationThatGiflibReadsBack) {
+  TempFolder folder;
+  const std::string path = folder.File("p.gif");
+  std::string error;
+  {
+    aperender::GifWriter gif;
+    ASSERT_TRUE(gif.Open(path, 4, 3, 5, &error)) << error;
+    ASSERT_TRUE(gif.AddFrame(Filled(4, 3, 0xFFFFFFFFu), &error)) << error;
+    ASSERT_TRUE(gif.AddFrame(Filled(4, 3, 0xFF000000u), &error)) << error;
+    EXPECT_FALSE(gif.AddFrame(Filled(5, 3, 0), &error));
+    EXPECT_EQ(error, "GIF frames must all be 4x3");
+    ASSERT_TRUE(gif.Close(&error)) << error;
+  }
+  int code = 0;
+  GifFileType* gif = DGifOpenFileName(path.c_str(), &code);
+  ASSERT_NE(gif, nullptr);
+  ASSERT_EQ(DGifSlurp(gif), GIF_OK);
+  EXPECT_EQ(gif->SWidth, 4);
+  EXPECT_EQ(gif->SHeight, 3);
+  ASSERT_EQ(gif->ImageCount, 2);
+  EXPECT_EQ(gif->SavedImages[0].RasterBits[0], 251);
+  EXPECT_EQ(gif->SavedImages[1].RasterBits[0], 0);
+  GraphicsControlBlock control;
+  ASSERT_EQ(DGifSavedExtensionToGCB(gif, 1, &control), GIF_OK);
+  EXPECT_EQ(control.DelayTime, 5);
+  DGifCloseFile(gif, &code);
+}
+
+TEST(ProgressTest, Texts) {
+  EXPECT_EQ(aperender::Progress::BarText(15, 60, 12.34, 3.6),
+            "[#######-----------------------] 15/60 frames  12.3 fps  4 s left");
+  EXPECT_EQ(aperender::Progress::LineText(60, 120, 2.0, 125.0),
+            "ape-render: 60/120 frames, 2.0 fps, 2 min 05 s left");
+  EXPECT_EQ(aperender::Progress::LineText(0, 10, 0.0, INFINITY),
+            "ape-render: 0/10 frames, 0.0 fps, ? s left");
+}
+
+// Reads what a Progress wrote into a memory stream.
+class ProgressOutput {
+ public:
+  ProgressOutput() : file_(open_memstream(&buffer_, &size_)) {}
+  ~ProgressOutput() {
+    std::fclose(file_);
+    std::free(buffer_);
+  }
+  std::FILE* File() { return file_; }
+  std::string Text() {
+    std::fflush(file_);
+    return std::string(buffer_, size_);
+  }
+
+ private:
+  char* buffer_ = nullptr;
+  std::size_t size_ = 0;
+  std::FILE* file_;
+};
+
+TEST(ProgressTest, LinesComeEveryFewSecondsAndAtTheEnd) {
+  ProgressOutput out;
+  double now = 0.0;
+  aperender::Progress progress(aperender::Progress::Mode::Lines, 4, out.File(),
+                               [&] { return now; });
+  now = 1.0;
+  progress.FrameDone(1);  // too soon for a line
+  now = 6.0;
+  progress.FrameDone(2);
+  now = 7.0;
+  progress.FrameDone(3);  // too soon again
+  now = 8.0;
+  progress.FrameDone(4);  // the last frame always shows
+  progress.Finish();
+  EXPECT_EQ(out.Text(),
+            "ape-render: 2/4 frames, 0.3 fps, 6 s left\n"
+            "ape-render: 4/4 frames, 0.5 fps, 0 s left\n");
+}
+
+TEST(ProgressTest, BarRedrawsInPlaceAndSilentWritesNothing) {
+  ProgressOutput bar;
+  double now = 0.0;
+  aperender::Progress progress(aperender::Progress::Mode::Bar, 2, bar.File(), [&] { return now; });
+  now = 1.0;
+  progress.FrameDone(1);
+  progress.Finish();
+  EXPECT_EQ(bar.Text(), "\r" + aperender::Progress::BarText(1, 2, 1.0, 1.0) + "\n");
+
+  ProgressOutput silent;
+  aperender::Progress quiet(aperender::Progress::Mode::Silent, 2, silent.File(),
+                            [&] { return now; });
+  quiet.FrameDone(2);
+  quiet.Finish();
+  EXPECT_EQ(silent.Text(), "");
+  EXPECT_EQ(aperender::Progress::ChooseMode(true), aperender::Progress::Mode::Silent);
+}
+
+aperender::FrameResult Frame(int frame, int live, int births, double channel_ms, double draw_ms) {
+  aperender::FrameResult result;
+  result.Frame = frame;
+  result.Seconds = frame / 30.0;
+  result.Particles.Live = live;
+  result.Particles.Births = births;
+  result.Particles.LogicSteps = 2;
+  result.ChannelMs = channel_ms;
+  result.DrawMs = draw_ms;
+  result.ReadbackMs = 1.0;
+  return result;
+}
+
+TEST(StatsTableTest, OneRowPerFrameAndTotals) {
+  aperender::StatsTable stats;
+  stats.Add(Frame(1, 10, 10, 3.0, 1.0));
+  stats.Add(Frame(2, 25, 15, 5.0, 0.5));
+  EXPECT_EQ(stats.Csv(),
+            "frame,seconds,live,attached,sliding,births,logic_steps,channel_ms,draw_ms,"
+            "simulation_and_vertex_ms,readback_ms\n"
+            "1,0.0333,10,0,0,10,2,3.000,1.000,2.000,1.000\n"
+            "2,0.0667,25,0,0,15,2,5.000,0.500,4.500,1.000\n");
+  const aperender::StatsTable::Totals totals = stats.Summarise();
+  EXPECT_EQ(totals.Frames, 2);
+  EXPECT_EQ(totals.PeakLive, 25);
+  EXPECT_EQ(totals.Births, 25);
+  EXPECT_EQ(totals.LogicSteps, 4);
+  EXPECT_DOUBLE_EQ(totals.MeanChannelMs, 4.0);
+  EXPECT_DOUBLE_EQ(totals.MaxChannelMs, 5.0);
+}
+
+TEST(RenderOutputTest, FrameNamesAreWideEnough) {
+  EXPECT_EQ(aperender::RenderOutput::FrameFileName(7, 120), "frame_0007.png");
+  EXPECT_EQ(aperender::RenderOutput::FrameFileName(7, 12345), "frame_00007.png");
+}
+
+TEST(RenderOutputTest, StatsOnlyWithoutPicturesAndStaleFilesGo) {
+  TempFolder folder;
+  std::ofstream(folder.File("frame_0099.png")) << "old";
+  std::ofstream(folder.File("notes.txt")) << "keep";
+  aperender::RenderOutput output;
+  std::string error;
+  ASSERT_TRUE(output.Open(folder.Path(), 2, 30.0, false, &error)) << error;
+  EXPECT_FALSE(std::filesystem::exists(folder.File("frame_0099.png")));
+  EXPECT_TRUE(std::filesystem::exists(folder.File("notes.txt")));
+  ASSERT_TRUE(output.AddFrame(Frame(1, 1, 1, 1, 0), &error));
+  ASSERT_TRUE(output.AddFrame(Frame(2, 1, 0, 1, 0), &error));
+  EXPECT_FALSE(std::filesystem::exists(folder.File("stats.csv")));  // not before the end
+  ASSERT_TRUE(output.Finish(&error)) << error;
+  EXPECT_TRUE(std::filesystem::exists(folder.File("stats.csv")));
+  EXPECT_FALSE(std::filesystem::exists(folder.File("contact_sheet.png")));
+  EXPECT_FALSE(std::filesystem::exists(folder.File("preview.gif")));
+}
+
+TEST(RenderOutputTest, PicturesMakeFramesSheetAndPreview) {
+  TempFolder folder;
+  aperender::RenderOutput output;
+  std::string error;
+  ASSERT_TRUE(output.Open(folder.Path(), 3, 50.0, true, &error)) << error;
+  for (int i = 1; i <= 3; ++i) {
+    aperender::FrameResult frame = Frame(i, 0, 0, 0, 0);
+    frame.HasPicture = true;
+    frame.Picture = Filled(640, 360, 0xFF000000u | static_cast<std::uint32_t>(i * 40));
+    ASSERT_TRUE(output.AddFrame(frame, &error)) << error;
+  }
+  EXPECT_TRUE(std::filesystem::exists(folder.File("preview.gif.partial")));
+  ASSERT_TRUE(output.Finish(&error)) << error;
+  EXPECT_EQ(output.FramesWritten(), 3);
+  Image sheet, first;
+  ASSERT_TRUE(apescene::ReadPng(folder.File("contact_sheet.png"), &sheet, &error));
+  EXPECT_EQ(sheet.Width, 3 * 320 + 4 * 4);  // three thumbnails halved to 320 wide
+  ASSERT_TRUE(apescene::ReadPng(folder.File("frame_0001.png"), &first, &error));
+  EXPECT_EQ(first.Argb[0], 0xFF000028u);
+  EXPECT_TRUE(std::filesystem::exists(folder.File("preview.gif")));
+  EXPECT_FALSE(std::filesystem::exists(folder.File("preview.gif.partial")));
+  // A 50 fps render previews at 25: every second frame, 1 and 3.
+  int code = 0;
+  GifFileType* gif = DGifOpenFileName(folder.File("preview.gif").c_str(), &code);
+  ASSERT_NE(gif, nullptr);
+  ASSERT_EQ(DGifSlurp(gif), GIF_OK);
+  EXPECT_EQ(gif->ImageCount, 2);
+  DGifCloseFile(gif, &code);
+}
+
+TEST(TimingDeviceTest, ForwardsEveryCallAndCountsDraws) {
+  MemoryDevice* inner = MemoryDevice::Create();
+  aperender::TimingDevice* timing = aperender::TimingDevice::Create(inner);
+  timing->SetRenderState(D3DRS_ZENABLE, 0);
+  timing->DrawPrimitive(D3DPT_POINTLIST, 0, 1);
+  EXPECT_EQ(inner->RenderState(D3DRS_ZENABLE), 0u);
+  ASSERT_FALSE(inner->Calls().empty());
+  EXPECT_EQ(inner->Calls().back().Name, "DrawPrimitive");
+  EXPECT_EQ(timing->DrawCalls(), 1);
+  EXPECT_GE(timing->DrawMs(), 0.0);
+  timing->ResetTimes();
+  EXPECT_EQ(timing->DrawCalls(), 0);
+  timing->Release();  // gives back its reference on the inner device
+  EXPECT_EQ(inner->Release(), 0u);
+}
+
+class ParticleCensusTest : public ::testing::Test {
+ protected:
+  ParticleCensusTest() { emitter_.Particles.resize(4); }
+  Qen_HostContext context_;
+  Qen_HostContext::ScopedCurrent current_{&context_};
+  Tev_AdvancedParticleEmitter emitter_;
+};
+
+TEST_F(ParticleCensusTest, CountsBirthsFromThePool) {
+  std::vector<Particle>& p = emitter_.Particles;
+  p[1].Active = true, p[1].Age = 0.5f;  // lives on
+  p[2].Active = true, p[2].Age = 0.9f;  // will be replaced by a new particle
+  p[3].Active = true, p[3].Age = 0.7f;  // will attach, which restarts its age
+  aperender::ParticleCensus census;
+  census.Before(emitter_);
+  p[0].Active = true, p[0].Age = 0.01f;  // born
+  p[1].Age = 0.53f;
+  p[2].Age = 0.02f;
+  p[3].Attached = true, p[3].Age = 0.0f;
+  const aperender::ParticleCounts counts = census.After(emitter_, 33.3);
+  EXPECT_EQ(counts.Live, 4);
+  EXPECT_EQ(counts.Attached, 1);
+  EXPECT_EQ(counts.Births, 2);
+}
+
+TEST_F(ParticleCensusTest, LogicStepsFromTheBankedTime) {
+  emitter_.LogicInterval = 20.0f;
+  emitter_.LogicAccumulator = 5.0f;
+  aperender::ParticleCensus census;
+  census.Before(emitter_);
+  emitter_.LogicAccumulator = 15.0f;  // 5 + 50 = 55 ms: two steps of 20, 15 left
+  EXPECT_EQ(census.After(emitter_, 50.0).LogicSteps, 2);
+  emitter_.Paused = true;  // a paused frame banks nothing
+  emitter_.LogicAccumulator = 5.0f;
+  EXPECT_EQ(census.After(emitter_, 50.0).LogicSteps, 0);
+  emitter_.Paused = false;
+  emitter_.LogicInterval = 0.0f;  // no rate: no steps, and no division by zero
+  EXPECT_EQ(census.After(emitter_, 50.0).LogicSteps, 0);
+}
+
+TEST_F(ParticleCensusTest, RebuiltPoolCountsNoBirths) {
+  aperender::ParticleCensus census;
+  census.Before(emitter_);
+  emitter_.Particles.assign(6, Particle{});
+  emitter_.Particles[0].Active = true;
+  const aperender::ParticleCounts counts = census.After(emitter_, 10.0);
+  EXPECT_EQ(counts.Live, 1);
+  EXPECT_EQ(counts.Births, 0);
+}
+
+}  // namespace
+}  // namespace scenetest
