@@ -5,7 +5,7 @@ BENCH_DIR ?= build/release
 JOBS ?= $(shell nproc)
 CMAKE_GEN = -G Ninja
 
-.PHONY: deps test test-sanitize demo bench format build
+.PHONY: deps test test-sanitize demo update-golden bench format build
 
 deps:
 	@scripts/install-deps
@@ -23,8 +23,14 @@ test-sanitize: deps
 	ASAN_OPTIONS=detect_leaks=1 UBSAN_OPTIONS=print_stacktrace=1 \
 	  ctest --test-dir $(SAN_DIR) --output-on-failure -j $(JOBS)
 
+# Renders the built-in fountain into out/demo/: frames, contact sheet, GIF preview, stats.
 demo: build
-	$(BUILD_DIR)/bin/ape-demo
+	APE_PLUGIN_DIR=$(BUILD_DIR)/plugins $(BUILD_DIR)/bin/ape-render --out out/demo
+
+# Renders the example scenes afresh into tests/golden/, after a deliberate change of a picture.
+update-golden: build
+	APE_UPDATE_GOLDEN=1 APE_PLUGIN_DIR=$(BUILD_DIR)/plugins \
+	  $(BUILD_DIR)/bin/visual_regression_test --gtest_filter='Scenes/*'
 
 bench: deps
 	cmake -S . -B $(BENCH_DIR) $(CMAKE_GEN) -DCMAKE_BUILD_TYPE=Release -DCMAKE_CXX_FLAGS_RELEASE=-O2 -DAPE_BUILD_TESTS=OFF
