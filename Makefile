@@ -5,7 +5,7 @@ BENCH_DIR ?= build/release
 JOBS ?= $(shell nproc)
 CMAKE_GEN = -G Ninja
 
-.PHONY: deps test test-sanitize demo update-golden bench format build
+.PHONY: deps test test-sanitize demo update-golden bench format build fuzz soak
 
 deps:
 	@scripts/install-deps
@@ -39,3 +39,26 @@ bench: deps
 
 format:
 	git ls-files '*.h' '*.cpp' | xargs clang-format -i
+
+# Robustness. "fuzz": the libFuzzer targets built by clang with AddressSanitizer and
+# UndefinedBehaviorSanitizer, each run for FUZZ_SECONDS on a copy of its corpus (fuzz/corpus/).
+# "soak": the example scenes for SOAK_FRAMES frames each under the sanitizers.
+FUZZ_DIR ?= build/fuzz
+FUZZ_SECONDS ?= 60
+FUZZ_SANITIZE = -fsanitize=fuzzer-no-link,address,undefined -fno-sanitize-recover=all -fno-omit-frame-pointer
+SOAK_DIR ?= build/soak
+SOAK_FRAMES ?= 100000
+
+fuzz: deps
+	cmake -S . -B $(FUZZ_DIR) $(CMAKE_GEN) -DCMAKE_BUILD_TYPE=RelWithDebInfo -DAPE_BUILD_BENCHMARKS=OFF -DAPE_FUZZ=ON \
+	  -DCMAKE_C_COMPILER=clang -DCMAKE_CXX_COMPILER=clang++ \
+	  "-DCMAKE_C_FLAGS=$(FUZZ_SANITIZE)" "-DCMAKE_CXX_FLAGS=$(FUZZ_SANITIZE)" \
+	  -DCMAKE_SHARED_LINKER_FLAGS=-fsanitize=address,undefined -DCMAKE_EXE_LINKER_FLAGS=-fsanitize=address,undefined
+	cmake --build $(FUZZ_DIR) -j $(JOBS) --target fuzz-emitter_host fuzz-scene_loader
+	fuzz/run-fuzzers $(FUZZ_DIR) $(FUZZ_SECONDS)
+
+soak: deps
+	cmake -S . -B $(SOAK_DIR) $(CMAKE_GEN) -DCMAKE_BUILD_TYPE=RelWithDebInfo -DAPE_SANITIZE=ON -DAPE_BUILD_BENCHMARKS=OFF
+	cmake --build $(SOAK_DIR) -j $(JOBS) --target ape-soak
+	ASAN_OPTIONS=detect_leaks=1 UBSAN_OPTIONS=print_stacktrace=1 \
+	  $(SOAK_DIR)/bin/ape-soak --frames $(SOAK_FRAMES) scenes/*.json

@@ -1,0 +1,65 @@
+// The scene harness: the example scenes load and run, and hostile texts are refused clearly.
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "fuzz/scene_input.h"
+
+namespace {
+
+apefuzz::SceneOutcome RunText(const std::string& text) {
+  return apefuzz::RunSceneInput(reinterpret_cast<const std::uint8_t*>(text.data()), text.size(),
+                                APE_SCENE_DIR);
+}
+
+TEST(SceneInput, ExampleScenesLoadAndRun) {
+  int scenes = 0;
+  for (const auto& entry : std::filesystem::directory_iterator(APE_SCENE_DIR)) {
+    if (entry.path().extension() != ".json") continue;
+    std::ifstream file(entry.path(), std::ios::binary);
+    const std::string text{std::istreambuf_iterator<char>(file), {}};
+    const apefuzz::SceneOutcome outcome = RunText(text);
+    EXPECT_TRUE(outcome.Loaded) << entry.path() << ": " << outcome.Refusal;
+    EXPECT_EQ(outcome.Fault, "") << entry.path();
+    ++scenes;
+  }
+  EXPECT_GE(scenes, 1);
+}
+
+struct HostileText {
+  const char* Name;
+  const char* Text;
+};
+
+class HostileScene : public testing::TestWithParam<HostileText> {};
+
+TEST_P(HostileScene, IsRefusedClearly) {
+  const apefuzz::SceneOutcome outcome = RunText(GetParam().Text);
+  EXPECT_FALSE(outcome.Loaded);
+  EXPECT_EQ(outcome.Fault, "") << outcome.Refusal;
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Texts, HostileScene,
+    testing::Values(HostileText{"Empty", ""}, HostileText{"NotJson", "\x01\xff\xfe garbage"},
+                    HostileText{"Array", "[1, 2, 3]"}, HostileText{"Null", "null"},
+                    HostileText{"UnknownType", R"({"channels": {"a": {"type": "Nope"}}})"},
+                    HostileText{"LinkToNothing",
+                                R"({"channels": {"e": {"type": "AdvancedParticleEmitter",
+                        "links": {"Emitter": "missing"}}}})"},
+                    HostileText{
+                        "HugeNumbers",
+                        R"({"fps": 1e308, "channels": {"e": {"type": "AdvancedParticleEmitter",
+                        "links": {"ParticleCount": 1e300, "Births Per Second": -1e300}}}})"},
+                    HostileText{"MissingFile", R"({"channels": {"m": {"type": "3D ObjectData",
+                        "obj": "no such file.obj"}}})"},
+                    HostileText{"DeepNesting",
+                                "[[[[[[[[[[[[[[[[[[[[[[[[[[[[[[[[[[[[[[[[]]]]]]]]]]]]]]]]]]]]"
+                                "]]]]]]]]]]]]]]]]]]]]"}),
+    [](const auto& info) { return std::string(info.param.Name); });
+
+}  // namespace
