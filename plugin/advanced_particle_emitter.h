@@ -10,6 +10,7 @@
 
 #include "host/object_data_channel.h"
 #include "render/vertex_layouts.h"
+#include "simulation/logic_step.h"
 #include "simulation/particle.h"
 
 class Tev_DX8_DeviceChannel;
@@ -200,6 +201,9 @@ class Tev_AdvancedParticleEmitter : public Tev_DX8_ObjectDataChannel {
     Qen_ValueVectorChannel* OutCollisionNormal = nullptr;
   };
   FrameLinks Frame;
+
+  // Taken at the start of each logic step and dropped at its end (scratch: never copied).
+  sim::LogicStepState Step;
 
  private:
   void CopySettingsFrom(const Tev_AdvancedParticleEmitter& other);

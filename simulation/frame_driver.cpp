@@ -163,11 +163,3 @@ int Tev_AdvancedParticleEmitter::RandInt(int low, int high) {
   if (range <= 1) return low;
   return static_cast<int>(std::rand() % range + low);
 }
-
-void Tev_AdvancedParticleEmitter::RunLogicStep() {
-  for (int i = 0; i < ParticleCount; ++i) {
-    const std::int32_t steps = Particles[i].PendingSteps;
-    for (std::int32_t k = 0; k < steps; ++k) UpdateParticle(i);
-    Particles[i].PendingSteps = 1;
-  }
-}

@@ -46,6 +46,11 @@ void Move(Tev_AdvancedParticleEmitter& e, Particle& p) {
 void GatherAttractorForce(const Tev_AdvancedParticleEmitter& e, Particle& p) {
   p.AttractorForce = sim::kZeroVector;
   if (p.Sliding && e.SlidingAttractorImmunity) return;
+  if (e.Step.AttractorsTaken) {
+    for (Tev_AdvPE_Attractor* attractor : e.Step.Attractors)
+      p.AttractorForce += attractor->GetForceAtPosition(p.RenderPosition);
+    return;
+  }
   const int count = e.GetChildLinkPositionCount(kLinkAttractors);
   for (int a = 0; a < count; ++a) {
     auto* attractor =

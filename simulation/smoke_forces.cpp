@@ -4,6 +4,7 @@
 #include "host/multi_collision_manager.h"
 #include "host/smoke_settings.h"
 #include "plugin/advanced_particle_emitter.h"
+#include "simulation/smoke_pairs.h"
 #include "simulation/vector_math.h"
 
 namespace {
@@ -14,45 +15,6 @@ void ApplyDrag(const Tev_AdvPE_SmokeSettings& smoke, Particle& p) {
     p.Velocity *= (1.0f - p.NormalizedAge) * smoke.Drag;
   else
     p.Velocity *= smoke.Drag;
-}
-
-// An envelope over distance, acting only strictly inside its index range.
-struct DistanceEnvelope {
-  Tev_EnvelopeStorage* Envelope;
-  float Minimum;
-  float Maximum;
-
-  explicit DistanceEnvelope(Tev_EnvelopeStorage* envelope)
-      : Envelope(envelope),
-        Minimum(envelope ? envelope->GetMinIndex() : 0.0f),
-        Maximum(envelope ? envelope->GetMaxIndex() : 0.0f) {}
-  bool Covers(float r) const { return Envelope && Minimum < r && r < Maximum; }
-};
-
-// Each pair is evaluated once, by its lower index, and acts equally and oppositely on both.
-// Coincident particles have no direction between them and exert no force.
-void AddPairForces(Tev_AdvancedParticleEmitter& e, int index, const Tev_AdvPE_SmokeSettings& smoke,
-                   float strength) {
-  const DistanceEnvelope repulsion(smoke.RepulsionEnvelope);
-  const DistanceEnvelope attraction(smoke.AttractionEnvelope);
-  Particle& p = e.Particles[index];
-  for (int j = index + 1; j < e.ParticleCount; ++j) {
-    Particle& other = e.Particles[j];
-    if (!other.Active) continue;
-    const D3DXVECTOR3 d = p.Position - other.Position;
-    const float r = sim::Length(d);
-    if (r == 0.0f) continue;
-    if (repulsion.Covers(r)) {
-      const D3DXVECTOR3 f = (d / r) * repulsion.Envelope->GetEnvelopeValue(r) * strength;
-      p.SmokeForce += f;
-      other.SmokeForce -= f;
-    }
-    if (attraction.Covers(r)) {
-      const D3DXVECTOR3 f = (d / r) * attraction.Envelope->GetEnvelopeValue(r) * strength;
-      p.SmokeForce -= f;
-      other.SmokeForce += f;
-    }
-  }
 }
 
 // Pushes the particle away from the surface it is heading for, within the envelope's reach.
@@ -83,8 +45,13 @@ void Tev_AdvancedParticleEmitter::SmokeStage(int index) {
                              : 0.0f;
   ApplyDrag(smoke, p);
   p.SmokeForce = sim::kZeroVector;
-  if ((smoke.RepulsionEnvelope || smoke.AttractionEnvelope) && p.Active)
-    AddPairForces(*this, index, smoke, strength);
+  if ((smoke.RepulsionEnvelope || smoke.AttractionEnvelope) && p.Active) {
+    if (Step.SmokePairs.Prepared())
+      Step.SmokePairs.AddPairForces(Particles, ParticleCount, index, strength);
+    else
+      sim::AddPairForcesAllPairs(Particles, ParticleCount, index, sim::PairEnvelopes(smoke),
+                                 strength);
+  }
   if (Frame.CollisionManager && smoke.CollisionEnabled) SmokeCollisionStage(p);
   if (Frame.CollisionManager && smoke.SurfaceRepulsionEnvelope)
     AddSurfaceRepulsion(*this, p, *smoke.SurfaceRepulsionEnvelope, strength);

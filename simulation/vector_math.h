@@ -10,13 +10,22 @@ namespace sim {
 
 inline constexpr D3DXVECTOR3 kZeroVector{0.0f, 0.0f, 0.0f};
 
+// The sum of the squared components, added in x, y, z order.
+inline float SquaredLength(const D3DXVECTOR3& v) {
+  return v.x * v.x + v.y * v.y + v.z * v.z;
+}
+
 // Square root of the sum of the squared components.
 inline float Length(const D3DXVECTOR3& v) {
-  return std::sqrt(v.x * v.x + v.y * v.y + v.z * v.z);
+  return std::sqrt(SquaredLength(v));
 }
 
 inline float Dot(const D3DXVECTOR3& a, const D3DXVECTOR3& b) {
   return a.x * b.x + a.y * b.y + a.z * b.z;
+}
+
+inline bool IsFinite(const D3DXVECTOR3& v) {
+  return std::isfinite(v.x) && std::isfinite(v.y) && std::isfinite(v.z);
 }
 
 // D3DXVec3Normalize: a zero vector stays zero.

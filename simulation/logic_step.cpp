@@ -1,0 +1,59 @@
+// One logic step over the pool, with what the step takes from the links once at its start.
+#include "simulation/logic_step.h"
+
+#include "host/attractor.h"
+#include "host/smoke_settings.h"
+#include "plugin/advanced_particle_emitter.h"
+#include "plugin/link_table.h"
+
+namespace {
+
+// The attractor list as every update of the step would enumerate it; left to the updates when
+// the link reading stage could not reserve room for it (the step allocates nothing).
+void TakeAttractors(Tev_AdvancedParticleEmitter& e) {
+  sim::LogicStepState& step = e.Step;
+  step.Attractors.clear();
+  const int count = e.GetChildLinkPositionCount(kLinkAttractors);
+  step.AttractorsTaken = static_cast<std::size_t>(count) <= step.Attractors.capacity();
+  if (!step.AttractorsTaken) return;
+  for (int a = 0; a < count; ++a) {
+    auto* attractor =
+        static_cast<Tev_AdvPE_Attractor*>(e.GetChildFromLinkPosition(kLinkAttractors, a));
+    if (attractor) step.Attractors.push_back(attractor);
+  }
+}
+
+void PrepareSmokePairs(Tev_AdvancedParticleEmitter& e) {
+  if (!e.SmokeEnabled) return;
+  const sim::PairEnvelopes envelopes(*e.Frame.SmokeSettings);
+  if (envelopes.Any()) e.Step.SmokePairs.Build(e.Particles, e.ParticleCount, envelopes);
+}
+
+// Drops the step's state however the step ends.
+class StepScope {
+ public:
+  explicit StepScope(Tev_AdvancedParticleEmitter& e) : e_(e) {
+    TakeAttractors(e);
+    PrepareSmokePairs(e);
+  }
+  ~StepScope() {
+    e_.Step.AttractorsTaken = false;
+    e_.Step.SmokePairs.Clear();
+  }
+  StepScope(const StepScope&) = delete;
+  StepScope& operator=(const StepScope&) = delete;
+
+ private:
+  Tev_AdvancedParticleEmitter& e_;
+};
+
+}  // namespace
+
+void Tev_AdvancedParticleEmitter::RunLogicStep() {
+  const StepScope scope(*this);
+  for (int i = 0; i < ParticleCount; ++i) {
+    const std::int32_t steps = Particles[i].PendingSteps;
+    for (std::int32_t k = 0; k < steps; ++k) UpdateParticle(i);
+    Particles[i].PendingSteps = 1;
+  }
+}
