@@ -133,6 +133,9 @@ float DrawLifespan(Tev_AdvancedParticleEmitter& e) {
 void Tev_AdvancedParticleEmitter::BirthParticle(int birthIndex) {
   auto* mesh = LinkAs<Tev_DX8_ObjectDataChannel>(*this, kLinkEmitter);
   if (!mesh) return;
+  // A host may call this between frames, after an envelope the last frame held went away. Within
+  // a frame the links cannot change, so this holds what the frame's link reading stage held.
+  sim::HoldMainEnvelopes(*this);
   const int index = ChooseRecord(*this);
   if (index < 0) return;
 

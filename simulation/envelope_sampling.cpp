@@ -3,9 +3,19 @@
 #include <algorithm>
 
 #include "host/envelope_storage.h"
+#include "plugin/advanced_particle_emitter.h"
 #include "plugin/link_reading.h"
+#include "plugin/link_table.h"
 
 namespace sim {
+
+void HoldMainEnvelopes(Tev_AdvancedParticleEmitter& e) {
+  e.SizeEnvelope = LinkAs<Tev_EnvelopeStorage>(e, kLinkSizeEnvelope);
+  e.AlphaEnvelope = LinkAs<Tev_EnvelopeStorage>(e, kLinkVertexAlphaEnvelope);
+  e.RedEnvelope = LinkAs<Tev_EnvelopeStorage>(e, kLinkRedColorEnvelope);
+  e.GreenEnvelope = LinkAs<Tev_EnvelopeStorage>(e, kLinkGreenColorEnvelope);
+  e.BlueEnvelope = LinkAs<Tev_EnvelopeStorage>(e, kLinkBlueColorEnvelope);
+}
 
 std::int32_t ColorByteAt(Tev_EnvelopeStorage* envelope, float x) {
   return envelope ? ColorComponent(envelope->GetEnvelopeValue(x)) : 0;

@@ -3,9 +3,15 @@
 
 #include <cstdint>
 
+class Tev_AdvancedParticleEmitter;
 class Tev_EnvelopeStorage;
 
 namespace sim {
+
+// Sets SizeEnvelope, AlphaEnvelope, RedEnvelope, GreenEnvelope and BlueEnvelope to the channels
+// linked now (null where nothing is). The members are not owned: between frames a host may
+// destroy a linked envelope, so an operation a host calls directly takes them afresh.
+void HoldMainEnvelopes(Tev_AdvancedParticleEmitter& e);
 
 // The envelope's value at x as a colour byte (truncated, capped at 255, no lower bound), or 0
 // when the envelope is absent.

@@ -303,6 +303,24 @@ W SpinAndLookAt() {
 
 }  // namespace
 
+ScriptWriter BirthAfterEnvelopeWentAway() {
+  W w;
+  w.SetValue(kLinkParticleCount, 8).SetValue(kLinkLogicUpdatesPerSecond, 60);
+  w.SetValue(kLinkBirthsPerSecond, 0).SetValue(kLinkEmitterActive, 1);
+  w.SetValue(kLinkVertexEmissions, 1);
+  // The mesh (channel 5), then one envelope per colour link and the size (channels 6 to 10).
+  LinkMesh(w, kFirst, kLinkEmitter, {{0, 0, 0}}, {});
+  for (int link : {kLinkSizeEnvelope, kLinkVertexAlphaEnvelope, kLinkRedColorEnvelope,
+                   kLinkGreenColorEnvelope, kLinkBlueColorEnvelope})
+    LinkEnvelope(w, kFirst, link, {{0, 100}, {1, 200}});
+  w.Frame(kFirst, 20).Frame(kFirst, 20);
+  for (int k = 0; k < 5; ++k) w.Op(kOpDestroyChannel).Byte(6);
+  w.Call(kFirst, kCallBirthParticle).SmallIndex(0);
+  w.Call(kFirst, kCallBirthParticle).SmallIndex(1);
+  w.Frame(kFirst, 20);
+  return w;
+}
+
 std::vector<NamedScript> HostSeeds() {
   std::vector<std::pair<std::string, W>> scripts;
   scripts.emplace_back("basic_fountain", BasicFountain());
@@ -325,6 +343,7 @@ std::vector<NamedScript> HostSeeds() {
   scripts.emplace_back("pool_changes", PoolChanges());
   scripts.emplace_back("clock_extremes", ClockExtremes());
   scripts.emplace_back("spin_and_look_at", SpinAndLookAt());
+  scripts.emplace_back("finding_birth_after_envelope_gone", BirthAfterEnvelopeWentAway());
   std::vector<NamedScript> seeds;
   for (auto& [name, writer] : scripts) seeds.push_back({name, writer.Bytes()});
   return seeds;

@@ -6,6 +6,8 @@
 #include <string>
 #include <vector>
 
+#include "fuzz/host_script.h"
+
 namespace apefuzz {
 
 struct NamedScript {
@@ -14,5 +16,9 @@ struct NamedScript {
 };
 
 std::vector<NamedScript> HostSeeds();
+
+// Inputs that once broke an invariant, kept as seeds and tests.
+// Envelopes held at the last frame are destroyed; the host then calls BirthParticle directly.
+ScriptWriter BirthAfterEnvelopeWentAway();
 
 }  // namespace apefuzz
