@@ -1,6 +1,5 @@
 // BirthParticle: one particle on the emitter mesh, with its first velocity, colour, size, spin
 // and lifespan. The rand() draws are made in a fixed order: point, size, spin, lifespan.
-#include <climits>
 #include <cstdlib>
 #include <optional>
 
@@ -167,5 +166,8 @@ void Tev_AdvancedParticleEmitter::BirthParticle(int birthIndex) {
   p.Sliding = false;
   p.Attached = false;
   p.Bouncing = true;
-  p.PendingSteps = birthIndex < INT_MAX ? birthIndex + 1 : INT_MAX;
+  // The frame driver numbers at most kMaximumBirthsPerFrame + 1 births; a larger number from a
+  // direct call would hold the next logic step in one particle's updates for hours.
+  p.PendingSteps =
+      birthIndex < kMaximumBirthsPerFrame ? birthIndex + 1 : kMaximumBirthsPerFrame + 1;
 }
