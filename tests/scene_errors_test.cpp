@@ -77,6 +77,9 @@ INSTANTIATE_TEST_SUITE_P(
         ErrorCase{"UnknownKey", WithChannel("{\"type\": \"Value\",\n \"valeu\": 1}"),
                   "test.json:2: channels.thing.valeu: unknown key (expected one of: type, "
                   "value)"},
+        ErrorCase{"DuplicateKey", WithEmitterLinks("{\"Bounce Rate\": 1,\n\"Bounce Rate\": 0}"),
+                  "test.json:2: channels.fx.links.\"Bounce Rate\": this key is given twice in "
+                  "the same object"},
         ErrorCase{"UnknownTopLevelKey", "{\"fsp\": 30}",
                   "test.json:1: fsp: unknown key (expected one of: description, resolution, "
                   "fps, duration, frames, seed, background, camera, channels)"},

@@ -1,6 +1,7 @@
 #include "tools/scene/json_locator.h"
 
 #include <cstdint>
+#include <set>
 
 namespace apescene {
 namespace {
@@ -8,7 +9,9 @@ namespace {
 // Walks a JSON text value by value, recording where each one starts.
 class Walker {
  public:
-  Walker(const std::string& text, std::map<std::string, int>* lines) : text_(text), lines_(lines) {}
+  Walker(const std::string& text, std::map<std::string, int>* lines, bool* has_duplicate,
+         DocPath* duplicate)
+      : text_(text), lines_(lines), has_duplicate_(has_duplicate), duplicate_(duplicate) {}
 
   void Run() {
     SkipSpace();
@@ -45,7 +48,7 @@ class Walker {
 
   void Value(const DocPath& path) {
     if (AtEnd()) return;
-    lines_->emplace(path.Text(), line_);
+    lines_->emplace(path.Text(), line_);  // a duplicate key keeps the line set for it
     switch (Peek()) {
       case '{':
         Object(path);
@@ -66,8 +69,15 @@ class Walker {
   void Object(const DocPath& path) {
     Advance();  // {
     SkipSpace();
+    std::set<std::string> seen;
     while (!AtEnd() && Peek() != '}') {
       const std::string key = String();
+      if (!seen.insert(key).second && !*has_duplicate_) {
+        *has_duplicate_ = true;
+        *duplicate_ = path.Key(key);
+        // The line of the second one, which is where the walk is now.
+        (*lines_)[duplicate_->Text()] = line_;
+      }
       SkipSpace();
       if (Peek() == ':') Advance();
       SkipSpace();
@@ -183,6 +193,8 @@ class Walker {
 
   const std::string& text_;
   std::map<std::string, int>* lines_;
+  bool* has_duplicate_;
+  DocPath* duplicate_;
   std::size_t pos_ = 0;
   int line_ = 1;
 };
@@ -190,7 +202,7 @@ class Walker {
 }  // namespace
 
 JsonLocator::JsonLocator(const std::string& text) {
-  Walker(text, &lines_).Run();
+  Walker(text, &lines_, &has_duplicate_, &duplicate_).Run();
 }
 
 int JsonLocator::LineOf(const DocPath& path) const {

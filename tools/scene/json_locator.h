@@ -16,11 +16,18 @@ class JsonLocator {
   // The 1-based line of the value at `path`, or of its nearest enclosing value; 0 when unknown.
   int LineOf(const DocPath& path) const;
 
+  // The first key given twice in one object, if any: nlohmann::json keeps only one of them, so a
+  // scene author's second value would vanish without a word.
+  bool HasDuplicateKey() const { return has_duplicate_; }
+  const DocPath& DuplicateKey() const { return duplicate_; }
+
   // 1-based line and column of a byte offset into the text.
   static void LineAndColumn(const std::string& text, std::size_t offset, int* line, int* column);
 
  private:
   std::map<std::string, int> lines_;  // path text -> line
+  bool has_duplicate_ = false;
+  DocPath duplicate_;
 };
 
 }  // namespace apescene

@@ -196,10 +196,12 @@ bool Run(const SceneSource& source, std::string* error, Build build) {
              SyntaxDetail(e.what());
     return false;
   }
+  const JsonLocator locator(source.Text);
   try {
+    if (locator.HasDuplicateKey())
+      throw SceneError(locator.DuplicateKey(), "this key is given twice in the same object");
     build(root);
   } catch (const SceneError& e) {
-    const JsonLocator locator(source.Text);
     const std::string where = WithLine(source.DisplayName, locator.LineOf(e.Path()));
     *error = where + ": " + (e.Path().IsRoot() ? "" : e.Path().Text() + ": ") + e.what();
     return false;
