@@ -34,13 +34,14 @@ float ReachSquaredAtLeast(float reach) {
   return squared;
 }
 
-template <typename T>
-void InsertionSortByIndex(T* items, int count) {
+// Hits arrive as a few ascending runs (one per neighbouring cell) and number a few dozen: an
+// insertion sort beats a general one here.
+void InsertionSort(std::uint64_t* keys, int count) {
   for (int i = 1; i < count; ++i) {
-    const T item = items[i];
+    const std::uint64_t key = keys[i];
     int j = i;
-    for (; j > 0 && items[j - 1].Index > item.Index; --j) items[j] = items[j - 1];
-    items[j] = item;
+    for (; j > 0 && keys[j - 1] > key; --j) keys[j] = keys[j - 1];
+    keys[j] = key;
   }
 }
 
@@ -65,11 +66,14 @@ bool EvaluatePair(const PairEnvelopes& envelopes, const D3DXVECTOR3& d, float r,
                   PairForce* force) {
   force->Repels = envelopes.Repulsion.Covers(r);
   force->Attracts = envelopes.Attraction.Covers(r);
+  if (!force->Repels && !force->Attracts) return false;
+  // The direction d / r, the same value wherever the definition writes it.
+  const D3DXVECTOR3 direction = d / r;
   if (force->Repels)
-    force->Repulsion = (d / r) * envelopes.Repulsion.Envelope->GetEnvelopeValue(r) * strength;
+    force->Repulsion = direction * envelopes.Repulsion.Envelope->GetEnvelopeValue(r) * strength;
   if (force->Attracts)
-    force->Attraction = (d / r) * envelopes.Attraction.Envelope->GetEnvelopeValue(r) * strength;
-  return force->Repels || force->Attracts;
+    force->Attraction = direction * envelopes.Attraction.Envelope->GetEnvelopeValue(r) * strength;
+  return true;
 }
 
 void AddPairForcesAllPairs(std::vector<Particle>& pool, int count, int index,
@@ -90,29 +94,34 @@ bool SmokePairGrid::Reserve(int count) noexcept {
   if (count <= 0) return true;
   const auto records = static_cast<std::size_t>(count);
   const std::size_t cells = records * kCellsPerParticle;
+  const std::size_t entries = records + kBlock;
   const auto hits = static_cast<std::size_t>(std::max(HitCapacity, 0));
-  if (CellOf_.size() >= records && Cursor_.size() >= cells && Hits_.size() >= hits) return true;
+  if (CellOf_.size() >= records && Fill_.size() >= cells && Hits_.size() >= hits) return true;
   try {
     CellOf_.resize(std::max(CellOf_.size(), records));
-    Entries_.resize(std::max(Entries_.size(), records));
-    Cursor_.resize(std::max(Cursor_.size(), cells));
-    CellStart_.resize(Cursor_.size() + 1);
+    Fill_.resize(std::max(Fill_.size(), cells));
+    CellStart_.resize(Fill_.size() + 1);
+    for (auto* axis : {&X_, &Y_, &Z_}) axis->resize(std::max(axis->size(), entries));
+    Index_.resize(std::max(Index_.size(), entries));
     Hits_.resize(std::max(Hits_.size(), hits));
+    Order_.resize(Hits_.size());
     return true;
   } catch (const std::exception&) {
     // Without its memory the grid stays unused: every step takes the all-pairs loop.
     std::vector<std::int32_t>().swap(CellOf_);
     std::vector<std::int32_t>().swap(CellStart_);
-    std::vector<std::int32_t>().swap(Cursor_);
-    std::vector<Entry>().swap(Entries_);
+    std::vector<std::int32_t>().swap(Fill_);
+    for (auto* axis : {&X_, &Y_, &Z_}) std::vector<float>().swap(*axis);
+    std::vector<std::int32_t>().swap(Index_);
     std::vector<Hit>().swap(Hits_);
+    std::vector<std::uint64_t>().swap(Order_);
     return false;
   }
 }
 
 bool SmokePairGrid::ChooseCells(double extentX, double extentY, double extentZ, int activeCount) {
   const double limit = std::min(static_cast<double>(activeCount) * kCellsPerParticle,
-                                static_cast<double>(Cursor_.size()));
+                                static_cast<double>(Fill_.size()));
   // Start no narrower than the widest extent spread over the limit, then widen until it fits.
   double cell = std::max(static_cast<double>(Envelopes_.Reach()) * kCellMargin,
                          std::max({extentX, extentY, extentZ}) / limit);
@@ -149,7 +158,7 @@ void SmokePairGrid::Build(const std::vector<Particle>& pool, int count,
   const float reach = envelopes.Reach();
   if (!(reach >= kMinimumGridReach)) return;
   if (count <= 0 || pool.size() < static_cast<std::size_t>(count) ||
-      CellOf_.size() < static_cast<std::size_t>(count) || Cursor_.empty())
+      CellOf_.size() < static_cast<std::size_t>(count) || Fill_.empty())
     return;
 
   // The box around the active particles. A particle at a non-finite position has no finite
@@ -196,51 +205,76 @@ void SmokePairGrid::Build(const std::vector<Particle>& pool, int count,
     ++CellStart_[cell + 1];
   }
   for (int c = 0; c < cells; ++c) CellStart_[c + 1] += CellStart_[c];
-  std::copy(CellStart_.begin(), CellStart_.begin() + cells, Cursor_.begin());
+  std::copy(CellStart_.begin(), CellStart_.begin() + cells, Fill_.begin());
   for (int i = 0; i < count; ++i) {
     const int cell = CellOf_[i];
     if (cell < 0) continue;
     const D3DXVECTOR3& position = pool[i].Position;
-    Entries_[Cursor_[cell]++] = {position.x, position.y, position.z, i};
+    const int entry = Fill_[cell]++;
+    X_[entry] = position.x;
+    Y_[entry] = position.y;
+    Z_[entry] = position.z;
+    Index_[entry] = i;
   }
-  std::copy(CellStart_.begin(), CellStart_.begin() + cells, Cursor_.begin());
 
   ReachSquared_ = ReachSquaredAtLeast(reach);
   Built_ = true;
   ++GridSteps;
 }
 
+bool SmokePairGrid::ScreenSpan(int begin, int end, const D3DXVECTOR3& position, int index,
+                               float strength, int* hitCount) {
+  const int capacity = std::min(HitCapacity, static_cast<int>(Hits_.size()));
+  const float reachSquared = ReachSquared_;
+  for (int base = begin; base < end; base += kBlock) {
+    const float* x = X_.data() + base;
+    const float* y = Y_.data() + base;
+    const float* z = Z_.data() + base;
+    const std::int32_t* partner = Index_.data() + base;
+    // A whole block screened at once: within reach, and of higher index (lower ones, and the
+    // particle itself, are never partners). Lanes past the span are ignored below.
+    std::int32_t near[kBlock];
+    for (int k = 0; k < kBlock; ++k) {
+      const float dx = position.x - x[k];
+      const float dy = position.y - y[k];
+      const float dz = position.z - z[k];
+      near[k] = (dx * dx + dy * dy + dz * dz < reachSquared) & (partner[k] > index);
+    }
+    std::int32_t any = 0;
+    for (int k = 0; k < kBlock; ++k) any |= near[k];
+    if (any == 0) continue;
+    const int lanes = std::min(kBlock, end - base);
+    for (int k = 0; k < lanes; ++k) {
+      if (near[k] == 0) continue;
+      // The pair as the all-pairs loop evaluates it: p.Position - other.Position and its length.
+      const D3DXVECTOR3 d(position.x - x[k], position.y - y[k], position.z - z[k]);
+      const float r = Length(d);
+      if (r == 0.0f) continue;
+      PairForce force;
+      if (!EvaluatePair(Envelopes_, d, r, strength, &force)) continue;
+      if (*hitCount >= capacity) return false;
+      Hits_[static_cast<std::size_t>(*hitCount)] = {partner[k], force};
+      ++*hitCount;
+    }
+  }
+  return true;
+}
+
 bool SmokePairGrid::CollectHits(const D3DXVECTOR3& position, int index, float strength,
                                 int* hitCount) {
-  const int capacity = std::min(HitCapacity, static_cast<int>(Hits_.size()));
   const int cx = CellCoordinate(position.x, OriginX_, CellsX_);
   const int cy = CellCoordinate(position.y, OriginY_, CellsY_);
   const int cz = CellCoordinate(position.z, OriginZ_, CellsZ_);
+  const int x0 = std::max(cx - 1, 0);
+  const int x1 = std::min(cx + 1, CellsX_ - 1);
+  if (x0 > x1) return true;
+  // The neighbouring cells of a row lie side by side: one span each.
   for (int z = std::max(cz - 1, 0); z <= std::min(cz + 1, CellsZ_ - 1); ++z) {
     for (int y = std::max(cy - 1, 0); y <= std::min(cy + 1, CellsY_ - 1); ++y) {
-      for (int x = std::max(cx - 1, 0); x <= std::min(cx + 1, CellsX_ - 1); ++x) {
-        const int cell = (z * CellsY_ + y) * CellsX_ + x;
-        // Lower indexes (and the particle itself) are never partners; indexes only grow
-        // during a step, so each cell's cursor only moves forward.
-        int begin = Cursor_[cell];
-        const int end = CellStart_[cell + 1];
-        while (begin < end && Entries_[begin].Index <= index) ++begin;
-        Cursor_[cell] = begin;
-        for (int e = begin; e < end; ++e) {
-          const Entry& other = Entries_[e];
-          // The same operands and operations as the all-pairs loop's p.Position - other.Position
-          // and its length.
-          const D3DXVECTOR3 d(position.x - other.X, position.y - other.Y, position.z - other.Z);
-          const float squared = SquaredLength(d);
-          if (!(squared < ReachSquared_)) continue;
-          const float r = std::sqrt(squared);
-          if (r == 0.0f) continue;
-          PairForce force;
-          if (!EvaluatePair(Envelopes_, d, r, strength, &force)) continue;
-          if (*hitCount >= capacity) return false;
-          Hits_[static_cast<std::size_t>((*hitCount)++)] = {other.Index, force};
-        }
-      }
+      const int row = (z * CellsY_ + y) * CellsX_;
+      if (!ScreenSpan(CellStart_[row + x0], CellStart_[row + x1 + 1], position, index, strength,
+                      hitCount))
+        return false;
     }
   }
   return true;
@@ -264,9 +298,16 @@ void SmokePairGrid::AddPairForces(std::vector<Particle>& pool, int count, int in
     AddPairForcesAllPairs(pool, count, index, Envelopes_, strength);
     return;
   }
-  InsertionSortByIndex(Hits_.data(), hits);
+  // The loop applies the pairs in ascending index: so do we.
   for (int h = 0; h < hits; ++h) {
-    const Hit& hit = Hits_[static_cast<std::size_t>(h)];
+    Order_[static_cast<std::size_t>(h)] =
+        static_cast<std::uint64_t>(Hits_[static_cast<std::size_t>(h)].Index) << 32 |
+        static_cast<std::uint32_t>(h);
+  }
+  InsertionSort(Order_.data(), hits);
+  for (int h = 0; h < hits; ++h) {
+    const Hit& hit =
+        Hits_[static_cast<std::size_t>(Order_[static_cast<std::size_t>(h)] & 0xFFFFFFFFu)];
     ApplyPair(p, pool[static_cast<std::size_t>(hit.Index)], hit.Force);
   }
 }

@@ -120,10 +120,9 @@ class SmokePairGrid {
   std::int64_t FallbackUpdates = 0;
 
  private:
-  struct Entry {
-    float X, Y, Z;
-    std::int32_t Index;
-  };
+  // Candidates are screened this many at a time, in loops the compiler turns into vector code.
+  static constexpr int kBlock = 8;
+
   struct Hit {
     std::int32_t Index;
     PairForce Force;
@@ -133,6 +132,9 @@ class SmokePairGrid {
   int CellCoordinate(float v, double origin, int cells) const;
   // Collects the acting pairs of `index`; false when more than HitCapacity act.
   bool CollectHits(const D3DXVECTOR3& position, int index, float strength, int* hitCount);
+  // The same for the entries [begin, end) of one row of neighbouring cells.
+  bool ScreenSpan(int begin, int end, const D3DXVECTOR3& position, int index, float strength,
+                  int* hitCount);
 
   PairEnvelopes Envelopes_;
   bool Prepared_ = false;
@@ -144,9 +146,13 @@ class SmokePairGrid {
 
   std::vector<std::int32_t> CellOf_;     // per pool record; -1 when not in the grid
   std::vector<std::int32_t> CellStart_;  // first entry of each cell, and one past the last cell
-  std::vector<std::int32_t> Cursor_;     // per cell: first entry not below the current index
-  std::vector<Entry> Entries_;           // by cell, ascending index within a cell
+  std::vector<std::int32_t> Fill_;       // per cell: the next entry to fill while building
+  // The entries' positions and indexes by cell, ascending index within a cell, with kBlock
+  // entries of room after the last so that a block never reads past the arrays.
+  std::vector<float> X_, Y_, Z_;
+  std::vector<std::int32_t> Index_;
   std::vector<Hit> Hits_;
+  std::vector<std::uint64_t> Order_;  // (index << 32) | slot of each hit, sorted to apply them
 };
 
 }  // namespace sim
