@@ -175,6 +175,28 @@ TEST(SceneFileErrorTest, ObjWithoutTrianglesIsRefused) {
           "\" holds no triangles");
 }
 
+TEST(SceneFileErrorTest, ObjIndexBeyondItsVerticesIsRefused) {
+  TestHost host;
+  TempFolder folder;
+  std::ofstream(folder.File("bad.obj"))
+      << "v 0 0 0\nv 1 0 0\nv 0 1 0\nvn 0 0 1\nf 1//1 2//1 3//7\n";
+  EXPECT_EQ(
+      host.ErrorOf(WithChannel(R"({"type": "3D ObjectData", "obj": "bad.obj"})"), folder.Path()),
+      "test.json:1: channels.thing.obj: OBJ file \"" + folder.File("bad.obj") +
+          "\" refers to a vertex, normal or texture coordinate it does not have");
+}
+
+TEST(SceneFileErrorTest, DeeplyNestedDocumentIsRefusedWithoutExhaustingTheStack) {
+  TestHost host;
+  const std::string deep =
+      "{\"description\": " + std::string(100000, '[') + std::string(100000, ']') + "}";
+  EXPECT_EQ(host.ErrorOf(deep), "test.json: the document nests deeper than 256 levels");
+  // 200 levels are fine as far as nesting goes (the description must still be text).
+  const std::string fine =
+      "{\"description\": " + std::string(200, '[') + std::string(200, ']') + "}";
+  EXPECT_EQ(host.ErrorOf(fine), "test.json:1: description: expected a string, got an array of 1");
+}
+
 TEST(SceneFileErrorTest, SettingsAloneReportSettingFaultsOnly) {
   apescene::SceneSource source;
   source.DisplayName = "s.json";

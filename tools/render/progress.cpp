@@ -9,7 +9,8 @@ namespace aperender {
 namespace {
 
 std::string SecondsLeft(double seconds) {
-  if (!std::isfinite(seconds)) return "? s left";
+  // Beyond a year the estimate means nothing (and would not fit a long).
+  if (!std::isfinite(seconds) || seconds > 3.2e7) return "? s left";
   char text[64];
   const long s = std::lround(seconds);
   if (s >= 60)

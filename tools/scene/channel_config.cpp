@@ -17,6 +17,9 @@
 namespace apescene {
 namespace {
 
+// Textures larger than this a side are refused (64 MB of pixels at most).
+constexpr int kMaximumTextureSize = 4096;
+
 const std::function<float(const Json&, const DocPath&)> kNumber = ReadNumber;
 const std::function<D3DXVECTOR3(const Json&, const DocPath&)> kVector = ReadVector3;
 const std::function<MatrixValue(const Json&, const DocPath&)> kMatrix = ReadMatrixValue;
@@ -148,9 +151,13 @@ void SceneBuilder::ConfigureTexture(Qen_Channel* channel, const Json& definition
     std::string error;
     if (!ReadPng(ResolveFile(ReadString(*file, path.Key("file"))), &image, &error))
       throw SceneError(path.Key("file"), error);
+    if (image.Width > kMaximumTextureSize || image.Height > kMaximumTextureSize)
+      throw SceneError(path.Key("file"), "the picture is " + std::to_string(image.Width) + "x" +
+                                             std::to_string(image.Height) + ", more than " +
+                                             std::to_string(kMaximumTextureSize) + " a side");
   } else {
     const std::string shape = ReadString(*name, path.Key("image"));
-    const int size = IntegerOr(definition, "size", path, 64, 1, 4096);
+    const int size = IntegerOr(definition, "size", path, 64, 1, kMaximumTextureSize);
     if (!MakeProceduralImage(shape, size, &image)) {
       std::string known;
       for (const std::string& n : ProceduralImageNames()) known += (known.empty() ? "" : ", ") + n;

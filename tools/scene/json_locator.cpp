@@ -10,8 +10,12 @@ namespace {
 class Walker {
  public:
   Walker(const std::string& text, std::map<std::string, int>* lines, bool* has_duplicate,
-         DocPath* duplicate)
-      : text_(text), lines_(lines), has_duplicate_(has_duplicate), duplicate_(duplicate) {}
+         DocPath* duplicate, bool* too_deep)
+      : text_(text),
+        lines_(lines),
+        has_duplicate_(has_duplicate),
+        duplicate_(duplicate),
+        too_deep_(too_deep) {}
 
   void Run() {
     SkipSpace();
@@ -47,7 +51,12 @@ class Walker {
   }
 
   void Value(const DocPath& path) {
-    if (AtEnd()) return;
+    if (AtEnd() || *too_deep_) return;
+    if (path.Steps().size() > static_cast<std::size_t>(JsonLocator::kMaximumDepth)) {
+      *too_deep_ = true;
+      pos_ = text_.size();  // abandon the walk
+      return;
+    }
     lines_->emplace(path.Text(), line_);  // a duplicate key keeps the line set for it
     switch (Peek()) {
       case '{':
@@ -195,6 +204,7 @@ class Walker {
   std::map<std::string, int>* lines_;
   bool* has_duplicate_;
   DocPath* duplicate_;
+  bool* too_deep_;
   std::size_t pos_ = 0;
   int line_ = 1;
 };
@@ -202,7 +212,7 @@ class Walker {
 }  // namespace
 
 JsonLocator::JsonLocator(const std::string& text) {
-  Walker(text, &lines_, &has_duplicate_, &duplicate_).Run();
+  Walker(text, &lines_, &has_duplicate_, &duplicate_, &too_deep_).Run();
 }
 
 int JsonLocator::LineOf(const DocPath& path) const {

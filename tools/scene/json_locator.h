@@ -21,12 +21,18 @@ class JsonLocator {
   bool HasDuplicateKey() const { return has_duplicate_; }
   const DocPath& DuplicateKey() const { return duplicate_; }
 
+  // Documents nested deeper than this are refused, so that walking them cannot exhaust the
+  // stack.
+  static constexpr int kMaximumDepth = 256;
+  bool TooDeep() const { return too_deep_; }
+
   // 1-based line and column of a byte offset into the text.
   static void LineAndColumn(const std::string& text, std::size_t offset, int* line, int* column);
 
  private:
   std::map<std::string, int> lines_;  // path text -> line
   bool has_duplicate_ = false;
+  bool too_deep_ = false;
   DocPath duplicate_;
 };
 

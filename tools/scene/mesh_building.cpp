@@ -42,6 +42,11 @@ D3DXVECTOR3 FaceNormal(const D3DXVECTOR3& a, const D3DXVECTOR3& b, const D3DXVEC
   return unit;
 }
 
+// Whether element `index` of a list of `size` numbers taken `width` at a time exists.
+bool InRange(int index, std::size_t size, std::size_t width) {
+  return index >= 0 && static_cast<std::size_t>(index) < size / width;
+}
+
 std::uint32_t Scale(std::uint32_t channel, float factor) {
   return static_cast<std::uint32_t>(
       std::lround(std::clamp(static_cast<float>(channel) * factor, 0.0f, 255.0f)));
@@ -73,6 +78,14 @@ bool LoadObjMesh(const std::string& path, Tev_DX8_ObjectDataChannel* mesh, std::
       bool has_normals = true;
       for (int k = 0; k < 3; ++k) {
         const tinyobj::index_t index = shape.mesh.indices[offset + static_cast<std::size_t>(k)];
+        if (!InRange(index.vertex_index, attrib.vertices.size(), 3) ||
+            (index.normal_index >= 0 && !InRange(index.normal_index, attrib.normals.size(), 3)) ||
+            (index.texcoord_index >= 0 &&
+             !InRange(index.texcoord_index, attrib.texcoords.size(), 2))) {
+          *error = "OBJ file \"" + path + "\" refers to a vertex, normal or texture coordinate " +
+                   "it does not have";
+          return false;
+        }
         const std::size_t p = 3 * static_cast<std::size_t>(index.vertex_index);
         triangle[k].Position = {attrib.vertices[p], attrib.vertices[p + 1],
                                 -attrib.vertices[p + 2]};

@@ -46,6 +46,8 @@ void SceneBuilder::BuildSettings(const Json& root) {
   CheckObject(root, DocPath(),
               {"description", "resolution", "fps", "duration", "frames", "seed", "background",
                "camera", "channels"});
+  if (const Json* description = Find(root, "description"))
+    ReadString(*description, DocPath().Key("description"));
   ReadSettings(root);
 }
 
@@ -197,6 +199,11 @@ bool Run(const SceneSource& source, std::string* error, Build build) {
     return false;
   }
   const JsonLocator locator(source.Text);
+  if (locator.TooDeep()) {
+    *error = source.DisplayName + ": the document nests deeper than " +
+             std::to_string(JsonLocator::kMaximumDepth) + " levels";
+    return false;
+  }
   try {
     if (locator.HasDuplicateKey())
       throw SceneError(locator.DuplicateKey(), "this key is given twice in the same object");
