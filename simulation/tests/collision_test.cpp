@@ -1,338 +1,258 @@
-// Collision response against a ground plane: report, attach, slide, bounce and die, with the exact
-// rand() draws each outcome takes.
+// Collision response against a ground plane (report, attach, slide, bounce, die, with the exact
+// rand() draws each outcome takes) and smoke against it (SmokeCollisionResponse, the smoke
+// collision stage, the surface look-ahead).
 #include <cmath>
-#include <cstdlib>
 
-#include "host/multi_collision_manager.h"
 #include "simulation/tests/emitter_fixture.h"
 
 namespace {
 
 constexpr D3DXVECTOR3 kUp{0.0f, 1.0f, 0.0f};
-constexpr D3DXVECTOR3 kOrigin{0.0f, 0.0f, 0.0f};
+constexpr D3DXVECTOR3 kDown{0.0f, -1.0f, 0.0f};
+constexpr D3DXVECTOR3 kZero{0.0f, 0.0f, 0.0f};
 
-// A ground plane y = 0 facing up, particles placed by hand, 50 logic steps per second.
+// Particles placed by hand over the ground, 50 logic steps per second.
 class Collision : public EmitterTest {
  protected:
   void SetUp() override {
     LinkBasics(100.0f, 50.0f, 0.0f);
-    manager = Make<Tev_MultiCollisionManager>();
-    ASSERT_EQ(manager->AddPlane(kOrigin, kUp), 0);
-    ASSERT_TRUE(emitter->SetChild(kLinkMultiCollisionManager, manager));
+    LinkGround();
   }
-  // One step above the ground, falling one unit per step: it hits in its next step.
+  // One unit above the ground, falling one unit per step: it hits in its next step.
   Particle& Falling(int index, float x = 0.0f) {
-    return PlaceParticle(index, {x, 1.0f, 0.0f}, {0.0f, -1.0f, 0.0f});
+    return PlaceParticle(index, {x, 1.0f, 0.0f}, kDown);
   }
-  bool Draw(const std::vector<int>& s, int& next, float rate) {
-    return static_cast<float>(s[static_cast<std::size_t>(next++)] % 100) * 0.01f < rate;
-  }
-
-  Tev_MultiCollisionManager* manager = nullptr;
 };
 
-TEST_F(Collision, EveryHitSticksJustAboveTheSurfaceWithItsAgeRestarted) {
+TEST_F(Collision, AnAttachingHitSticksJustAboveTheSurfaceWithItsAgeRestarted) {
   SetValue(kLinkAttachRate, 1.0f);
   SetValue(kLinkAttachedSlideRate, 0.0f);
-  SetValue(kLinkAttachedLifespan, 100.0f);
+  SetValue(kLinkAlignToNormals, 1.0f);
+  SetEnvelope(kLinkVertexAlphaEnvelope, {{0.0f, 200.0f}});
   Start();
   Particle& p = Falling(0);
   p.Age = 5.0f;
   p.SpinSpeed = 0.3f;
   const std::vector<int> s = RandSequence(17u, 8);
   StepOnce();
-  EXPECT_TRUE(P(0).Attached);
-  EXPECT_TRUE(P(0).Active);
-  EXPECT_FALSE(P(0).Sliding);
+  EXPECT_EQ(DrawsTaken(s), 2);  // attach, then slide
+  EXPECT_TRUE(P(0).Attached && !P(0).Sliding);
   EXPECT_EQ(P(0).Position, D3DXVECTOR3(0.0f, 0.01f, 0.0f));
-  EXPECT_EQ(P(0).Velocity, kOrigin);
+  EXPECT_EQ(P(0).Velocity, kZero);
   EXPECT_EQ(P(0).Age, 0.0f);
   EXPECT_EQ(P(0).SpinSpeed, 0.0f);
-  EXPECT_EQ(DrawsTaken(s), 2);  // attach, then slide
-
-  StepOnce();
-  EXPECT_EQ(P(0).Position, D3DXVECTOR3(0.0f, 0.01f, 0.0f));
-  EXPECT_EQ(P(0).Age, 0.02f);
+  EXPECT_EQ(P(0).AttachAlpha, 200);
+  EXPECT_EQ(P(0).LookAtPoint, D3DXVECTOR3(0.0f, 1.01f, 0.0f));
 }
 
-TEST_F(Collision, RainFromTheEmitterSettlesOnTheGround) {
-  SetValue(kLinkBirthsPerSecond, 20.0f);
-  SetEmitterMesh({{0.0f, 3.0f, 0.0f}}, {});
-  SetVector(kLinkInitialForceOverride, {0.0f, -1.0f, 0.0f});
-  SetValue(kLinkAttachRate, 1.0f);
-  SetValue(kLinkAttachedLifespan, 100.0f);
-  Start();
-  RunFrames(20, 50.0);
-  int attached = 0;
-  for (const Particle& p : emitter->Particles) {
-    if (!p.Active) continue;
-    if (p.Attached) {
-      ++attached;
-      EXPECT_EQ(p.Position, D3DXVECTOR3(0.0f, 0.01f, 0.0f));
-      EXPECT_EQ(p.Velocity, kOrigin);
-    } else {
-      EXPECT_GT(p.Position.y, 0.0f);
-    }
-  }
-  EXPECT_GT(attached, 10);
-}
-
-TEST_F(Collision, AttachedParticlesShowTheLowerHalfOfTheCompositeTexture) {
-  auto* particleTexture = Make<Qen_TextureChannel>();
-  auto* attachedTexture = Make<Qen_TextureChannel>();
-  ASSERT_GE(particleTexture->CreateTexture(4, 4), 0);
-  ASSERT_GE(attachedTexture->CreateTexture(4, 4), 0);
-  ASSERT_TRUE(emitter->SetChild(kLinkParticleTexture, particleTexture));
-  ASSERT_TRUE(emitter->SetChild(kLinkAttachedTexture, attachedTexture));
-  SetValue(kLinkAttachRate, 1.0f);
-  Start();
-  ASSERT_TRUE(emitter->HasCompositeTexture);
-  Falling(0);
-  Falling(1, 5.0f).Velocity = {0.0f, 0.0f, 0.0f};
-  StepOnce();
-  ASSERT_TRUE(P(0).Attached);
-  ASSERT_NE(emitter->LocalVertices, nullptr);
-  EXPECT_EQ(emitter->LocalVertices[0].Tv, 0.5f);
-  EXPECT_EQ(emitter->LocalVertices[2].Tv, 1.0f);
-  EXPECT_EQ(emitter->LocalVertices[4].Tv, 0.0f);
-  EXPECT_EQ(emitter->LocalVertices[6].Tv, 0.5f);
-}
-
-struct BounceCase {
-  const char* Name;
-  D3DXVECTOR3 Velocity;
-  D3DXVECTOR3 Expected;
-};
-
-class Bounce : public Collision, public ::testing::WithParamInterface<BounceCase> {};
-
-TEST_P(Bounce, MirrorsTheDirectionAtHalfSpeed) {
+// The mirror image of the direction at half speed; it moves by it in the same update.
+TEST_F(Collision, ABouncingHitMirrorsTheDirectionAtHalfSpeed) {
+  const D3DXVECTOR3 cases[][2] = {
+      {{0, -1, 0}, {0, 0.5f, 0}}, {{3, -4, 0}, {1.5f, 2, 0}}, {{0, -4, 3}, {0, 2, 1.5f}}};
   SetValue(kLinkBounceRate, 1.0f);
   Start();
-  Particle& p = Falling(0);
-  p.Velocity = GetParam().Velocity;
-  p.Bouncing = false;
-  const std::vector<int> s = RandSequence(23u, 8);
-  StepOnce();
-  EXPECT_TRUE(P(0).Active);
-  EXPECT_TRUE(P(0).Bouncing);
-  EXPECT_NEAR(P(0).Velocity.x, GetParam().Expected.x, 1e-6f);
-  EXPECT_NEAR(P(0).Velocity.y, GetParam().Expected.y, 1e-6f);
-  EXPECT_NEAR(P(0).Velocity.z, GetParam().Expected.z, 1e-6f);
-  // It moves by the new velocity in the same update.
-  EXPECT_NEAR(P(0).Position.y, 1.0f + GetParam().Expected.y, 1e-6f);
-  EXPECT_EQ(DrawsTaken(s), 2);  // attach (fails at rate 0), then bounce
+  for (const auto& c : cases) {
+    Falling(0).Velocity = c[0];
+    P(0).Bouncing = false;
+    const std::vector<int> s = RandSequence(23u, 8);
+    StepOnce();
+    EXPECT_EQ(DrawsTaken(s), 2);  // attach (fails at rate 0), then bounce
+    EXPECT_TRUE(P(0).Active && P(0).Bouncing);
+    ExpectNear(P(0).Velocity, c[1]);
+    ExpectNear(P(0).Position, D3DXVECTOR3(0.0f, 1.0f, 0.0f) + c[1]);
+  }
 }
 
-INSTANTIATE_TEST_SUITE_P(
-    Directions, Bounce,
-    ::testing::Values(BounceCase{"Straight", {0.0f, -1.0f, 0.0f}, {0.0f, 0.5f, 0.0f}},
-                      BounceCase{"Diagonal", {3.0f, -4.0f, 0.0f}, {1.5f, 2.0f, 0.0f}},
-                      BounceCase{"Fast", {0.0f, -4.0f, 3.0f}, {0.0f, 2.0f, 1.5f}}),
-    [](const auto& info) { return std::string(info.param.Name); });
-
-TEST_F(Collision, WithoutAnySuccessfulRateAHitKillsButTheUpdateRunsOn) {
-  SetValue(kLinkBounceRate, 0.0f);
-  Start();
-  Falling(0).Color = 0x12345678u;
-  StepOnce();
-  EXPECT_FALSE(P(0).Active);
-  EXPECT_EQ(P(0).Position, kOrigin);  // the move stage still ran
-  EXPECT_EQ(P(0).Color, 0u);          // and so did the colour stage
-}
-
-TEST_F(Collision, AnAttachRateDecidesEachHitByItsOwnDraws) {
+// With "Attach Rate" 0.3 alone, each hit attaches by its own draw and dies otherwise; the
+// stages after the collision still run for a particle that died.
+TEST_F(Collision, EachHitIsDecidedByItsOwnDraws) {
   SetValue(kLinkAttachRate, 0.3f);
   Start();
-  constexpr int kCount = 100;
-  for (int i = 0; i < kCount; ++i) Falling(i, static_cast<float>(i));
-  const std::vector<int> s = RandSequence(31u, 2 * kCount + 4);
+  for (int i = 0; i < 100; ++i) Falling(i, static_cast<float>(i)).Color = 0x12345678u;
+  const std::vector<int> s = RandSequence(31u, 204);
   StepOnce();
-  int next = 0;
   int attached = 0;
-  for (int i = 0; i < kCount; ++i) {
-    const bool attaches = Draw(s, next, 0.3f);
-    ++next;  // the slide draw, or the bounce draw at rate 0
+  for (int i = 0; i < 100; ++i) {
+    const bool attaches = static_cast<float>(s[2 * i] % 100) * 0.01f < 0.3f;
     EXPECT_EQ(P(i).Attached, attaches) << i;
     EXPECT_EQ(P(i).Active, attaches) << i;
+    EXPECT_EQ(P(i).Position.y, attaches ? 0.01f : 0.0f) << i;  // the later stages ran
+    EXPECT_EQ(P(i).Color, 0u) << i;
     attached += attaches;
   }
-  EXPECT_EQ(DrawsTaken(s), 2 * kCount);
+  EXPECT_EQ(DrawsTaken(s), 200);  // the slide draw, or the bounce draw at rate 0
   EXPECT_GT(attached, 15);
   EXPECT_LT(attached, 45);
 }
 
+// Reports follow their rate, the last of a frame stands, the particles fly on; a frame without a
+// report sets the ID back to 0 and keeps the vectors.
 TEST_F(Collision, ReportsAloneLetParticlesThrough) {
-  SetValue(kLinkCollisionReportRate, 1.0f);
+  SetValue(kLinkCollisionReportRate, 0.5f);
   auto* id = SetValue(kLinkOutCollisionId, 7.0f);
-  auto* position = SetVector(kLinkOutCollisionPosition, {9.0f, 9.0f, 9.0f});
+  auto* position = SetVector(kLinkOutCollisionPosition, {-1.0f, -1.0f, -1.0f});
   auto* normal = SetVector(kLinkOutCollisionNormal, {9.0f, 9.0f, 9.0f});
   Start();
-  Falling(0, 3.0f);
-  const std::vector<int> s = RandSequence(5u, 4);
+  for (int i = 0; i < 40; ++i) Falling(i, static_cast<float>(i));
+  const std::vector<int> s = RandSequence(41u, 44);
   StepOnce();
-  EXPECT_EQ(id->GetValue(), 1.0f);
-  EXPECT_EQ(position->GetVector(), D3DXVECTOR3(3.0f, 0.0f, 0.0f));
-  EXPECT_EQ(normal->GetVector(), kUp);
-  EXPECT_EQ(DrawsTaken(s), 1);
-  EXPECT_TRUE(P(0).Active);
-  EXPECT_FALSE(P(0).Attached);
-
-  // On the plane it is hit again; below it, no more: the ID goes back to 0, the vectors stay.
-  StepOnce();
-  StepOnce();
-  EXPECT_LT(P(0).Position.y, 0.0f);
-  EXPECT_EQ(id->GetValue(), 0.0f);
-  EXPECT_EQ(position->GetVector(), D3DXVECTOR3(3.0f, 0.0f, 0.0f));
-  EXPECT_EQ(normal->GetVector(), kUp);
-}
-
-TEST_F(Collision, TheLastReportOfAFrameStandsAndReportsFollowTheRate) {
-  SetValue(kLinkCollisionReportRate, 0.5f);
-  auto* position = SetVector(kLinkOutCollisionPosition, {-1.0f, -1.0f, -1.0f});
-  Start();
-  constexpr int kCount = 40;
-  for (int i = 0; i < kCount; ++i) Falling(i, static_cast<float>(i));
-  const std::vector<int> s = RandSequence(41u, kCount + 4);
-  StepOnce();
-  int next = 0;
   int last = -1;
-  for (int i = 0; i < kCount; ++i)
-    if (Draw(s, next, 0.5f)) last = i;
-  ASSERT_GE(last, 0);
+  for (int i = 0; i < 40; ++i)
+    if (static_cast<float>(s[i] % 100) * 0.01f < 0.5f) last = i;
+  EXPECT_EQ(DrawsTaken(s), 40);
+  EXPECT_EQ(id->GetValue(), 1.0f);  // object 0
   EXPECT_EQ(position->GetVector(), D3DXVECTOR3(static_cast<float>(last), 0.0f, 0.0f));
-  EXPECT_EQ(DrawsTaken(s), kCount);
+  EXPECT_EQ(normal->GetVector(), kUp);
+  EXPECT_EQ(ActiveCount(), 40);
+  StepOnce();  // on the plane: hit again
+  const D3DXVECTOR3 kept = position->GetVector();
+  StepOnce();  // below it: no report
+  EXPECT_EQ(id->GetValue(), 0.0f);
+  EXPECT_EQ(position->GetVector(), kept);
+  EXPECT_LT(P(0).Position.y, 0.0f);
 }
 
-TEST_F(Collision, TheReportedIdIsTheObjectsIdPlusOne) {
-  manager->ClearObjects();
-  ASSERT_EQ(manager->AddPlane({0.0f, 50.0f, 0.0f}, {0.0f, -1.0f, 0.0f}), 0);
-  ASSERT_EQ(manager->AddPlane(kOrigin, kUp), 1);
-  SetValue(kLinkCollisionReportRate, 1.0f);
-  auto* id = SetValue(kLinkOutCollisionId, 0.0f);
-  Start();
-  Falling(0);
-  StepOnce();
-  EXPECT_EQ(id->GetValue(), 2.0f);
-}
-
+// Starting to slide captures the look at the hit; a sliding particle then stays at its height
+// along the surface, with no draw and no report.
 TEST_F(Collision, ASlidingParticleStaysAtItsHeightAndIsNeverReported) {
   SetValue(kLinkAttachRate, 1.0f);
   SetValue(kLinkAttachedSlideRate, 1.0f);
   SetValue(kLinkAttachedSlidingHeight, 0.2f);
   SetValue(kLinkCollisionReportRate, 1.0f);
+  SetEnvelope(kLinkSizeEnvelope, {{0.0f, 1.25f}});
   auto* id = SetValue(kLinkOutCollisionId, 0.0f);
   SetVector(kLinkGlobalForce, {0.25f, -1.0f, 0.0f});
   Start();
   Falling(0).Velocity = {-0.25f, 0.0f, 0.0f};  // with the force: one unit down this step
+  P(0).AttachRed = 77;
   StepOnce();
-  ASSERT_TRUE(P(0).Sliding);
-  EXPECT_FALSE(P(0).Attached);
+  ASSERT_TRUE(P(0).Sliding && !P(0).Attached);
+  EXPECT_EQ(P(0).Position, D3DXVECTOR3(0.0f, 0.2f, 0.0f));
   EXPECT_EQ(P(0).SurfaceNormal, kUp);
+  EXPECT_EQ(P(0).AttachSize, 1.25f);
+  EXPECT_EQ(P(0).AttachRed, 77);    // no red envelope: kept
   EXPECT_EQ(id->GetValue(), 1.0f);  // reported as it arrived
-
-  float x = P(0).Position.x;
   const std::vector<int> s = RandSequence(3u, 4);
-  for (int step = 0; step < 10; ++step) {
+  for (int step = 0; step < 5; ++step) {
+    const float x = P(0).Position.x;
     StepOnce();
-    EXPECT_TRUE(P(0).Active);
     EXPECT_EQ(P(0).Position.y, 0.2f) << step;
     EXPECT_GT(P(0).Position.x, x) << step;
-    x = P(0).Position.x;
     EXPECT_EQ(id->GetValue(), 0.0f) << step;
   }
   EXPECT_EQ(DrawsTaken(s), 0);
 }
 
-TEST_F(Collision, SlidingStartsAtTheSlidingHeightWithItsLookCaptured) {
-  SetValue(kLinkAttachRate, 1.0f);
-  SetValue(kLinkAttachedSlideRate, 1.0f);
-  SetValue(kLinkAttachedSlidingHeight, 0.5f);
-  // Flat around the middle of life, zero at its ends.
-  SetEnvelope(kLinkSizeEnvelope, {{0.0f, 0.0f}, {0.4f, 1.25f}, {0.6f, 1.25f}, {1.0f, 0.0f}});
-  SetEnvelope(kLinkVertexAlphaEnvelope,
-              {{0.0f, 0.0f}, {0.4f, 300.0f}, {0.6f, 300.0f}, {1.0f, 0.0f}});
-  Start();
-  Particle& p = Falling(0);
-  p.Position.y = 1.5f;
-  p.Age = 49.979f;  // normalized age 0.5 at the step
-  p.AttachRed = 77;
-  StepOnce();
-  ASSERT_TRUE(P(0).Sliding);
-  EXPECT_EQ(P(0).Position, D3DXVECTOR3(0.0f, 0.5f, 0.0f));
-  EXPECT_EQ(P(0).Velocity, kOrigin);
-  EXPECT_EQ(P(0).AttachSize, 1.25f);
-  EXPECT_EQ(P(0).AttachAlpha, 255);
-  EXPECT_EQ(P(0).AttachRed, 77);  // no red envelope: kept
-}
-
-TEST_F(Collision, AStuckParticleLivesOutItsAttachedLifespanThenEnds) {
-  SetValue(kLinkAttachRate, 1.0f);
-  SetValue(kLinkAttachedLifespan, 0.5f);
-  SetValue(kLinkAlignToNormals, 1.0f);
-  SetEnvelope(kLinkVertexAlphaEnvelope, {{0.0f, 200.0f}});
-  SetEnvelope(kLinkAttachedAlphaOffsetEnvelope, {{0.0f, 1.0f}, {1.0f, 0.0f}});
-  Start();
-  Falling(0);
-  StepOnce();
-  ASSERT_TRUE(P(0).Attached);
-  EXPECT_EQ(P(0).AttachAlpha, 200);
-  EXPECT_EQ(P(0).LookAtPoint, D3DXVECTOR3(0.0f, 1.01f, 0.0f));
-  RunFrame(250.0);  // a quarter second into its attached life: alpha half way down
-  EXPECT_TRUE(P(0).Active);
-  EXPECT_EQ(P(0).Color >> 24, 100u);
-  EXPECT_EQ(P(0).LookAtPoint, D3DXVECTOR3(0.0f, 1.01f, 0.0f));
-  RunFrame(300.0);
-  EXPECT_FALSE(P(0).Active);
-  EXPECT_FALSE(P(0).Attached);
-}
-
-TEST_F(Collision, WithoutAnAttachedLifespanAStuckParticleNeverEnds) {
-  SetValue(kLinkAttachRate, 1.0f);
-  Start();
-  Falling(0);
-  StepOnce();
-  ASSERT_TRUE(P(0).Attached);
-  RunFrames(5, 1000.0);
-  EXPECT_TRUE(P(0).Active);
-  EXPECT_TRUE(P(0).Attached);
-  EXPECT_EQ(emitter->AttachedLifespan, -1.0f);
-}
-
-TEST_F(Collision, NoCollisionWithoutTheManagerOrAnyRate) {
+TEST_F(Collision, NoCollisionWithoutTheManagerOrAnyRateAndUnlinkedSettingsReadTheirDefaults) {
   Start();
   Falling(0);
   const std::vector<int> s = RandSequence(3u, 4);
   StepOnce();
-  EXPECT_EQ(P(0).Position.y, 0.0f);
   StepOnce();
-  EXPECT_EQ(P(0).Position.y, -1.0f);
-
   SetValue(kLinkAttachRate, 1.0f);
   Unlink(kLinkMultiCollisionManager);
-  Falling(1);
   StepOnce();
-  StepOnce();
-  EXPECT_EQ(P(1).Position.y, -1.0f);
+  EXPECT_EQ(P(0).Position.y, -2.0f);
   EXPECT_EQ(DrawsTaken(s), 0);
+  EXPECT_FALSE(emitter->ReportCollisions);
+  EXPECT_TRUE(emitter->CollisionResponse);
+  EXPECT_EQ(emitter->BounceRate, 0.0f);
+  EXPECT_EQ(emitter->AttachedLifespan, -1.0f);
 }
 
-TEST_F(Collision, SettingsReadTheirDefaultsWhenUnlinked) {
-  SetValue(kLinkCollisionReportRate, 0.4f);
+// A surface 5 below; speed 1, radius 0.5, approach factor 0.3.
+TEST_F(Collision, SmokeCollisionResponseSlowsBeforeASurfaceWithinTheProbe) {
+  const struct {
+    float ProbeMinimum;
+    D3DXVECTOR3 Direction;
+    bool Linked, Hit;
+  } cases[] = {{10.0f, kDown, true, true},
+               {2.0f, kDown, true, false},
+               {10.0f, kUp, true, false},
+               {10.0f, kDown, false, false}};
+  for (const auto& c : cases) {
+    if (!c.Linked) Unlink(kLinkMultiCollisionManager);
+    D3DXVECTOR3 at{0.0f, 5.0f, 0.0f}, direction = c.Direction, position, velocity, normal;
+    EXPECT_EQ(emitter->SmokeCollisionResponse(c.ProbeMinimum, 0.3f, 0.5f, 1.0f, &at, 1.0f,
+                                              &direction, &position, &velocity, &normal),
+              c.Hit);
+    if (!c.Hit) continue;
+    EXPECT_EQ(velocity, D3DXVECTOR3(0.0f, -0.3f, 0.0f));
+    EXPECT_EQ(position, D3DXVECTOR3(0.0f, 4.7f, 0.0f));
+    EXPECT_EQ(normal, kUp);
+  }
+}
+
+// In contact the motion continues along the surface, never faster than speed x contact factor.
+TEST_F(Collision, SmokeCollisionResponseInContactSlidesAlongTheSurface) {
+  const struct {
+    D3DXVECTOR3 Direction;
+    float Speed, Radius, Contact;
+  } cases[] = {{{1, -2, 0}, std::sqrt(5.0f), 0.5f, 0.5f},
+               {{3, -0.2f, 1}, 2.0f, 8.0f, 0.7f},
+               {{0.1f, -1, 0}, 0.5f, 0.1f, 2.0f}};
+  for (const auto& c : cases) {
+    D3DXVECTOR3 at{0.0f, 0.3f, 0.0f}, direction, position, velocity, normal;
+    D3DXVec3Normalize(&direction, &c.Direction);
+    ASSERT_TRUE(emitter->SmokeCollisionResponse(0.0f, 1.0f, c.Radius, c.Contact, &at, c.Speed,
+                                                &direction, &position, &velocity, &normal));
+    // The step's end projected onto the plane, from the hit, capped at the speed.
+    const D3DXVECTOR3 hit = at + direction * (at.y / -direction.y);
+    D3DXVECTOR3 along = at + direction * (c.Speed + c.Radius) - hit;
+    along.y = 0.0f;
+    if (D3DXVec3Length(&along) > c.Speed) along *= c.Speed / D3DXVec3Length(&along);
+    ExpectNear(velocity, along * c.Contact, 1e-4f);
+    ExpectNear(position, at + velocity, 1e-4f);
+  }
+}
+
+// A smoke particle of size 1 falling one unit per step from (0, 5, 0), with debug colours.
+TEST_F(Collision, TheSmokeCollisionStageSteersRechecksAndColours) {
+  const struct {
+    float ProbeMinimum, Approach, Recheck, Enabled, Debug;
+    std::uint32_t Color;
+    float Y, VelocityY;
+  } cases[] = {
+      {0.0f, 0.25f, 0, 1, 1, 0x00FFFFFF, 4.0f, -1.0f},     // nothing in reach: white, moves on
+      {10.0f, 0.25f, 0, 1, 1, 0x00FF0000, 4.5f, -0.25f},   // slowed; the move adds it again
+      {10.0f, 0.25f, 1, 1, 1, 0x00FF0000, 4.75f, -0.25f},  // rechecked: placed, not moved again
+      {10.0f, 5.0f, 1, 1, 1, 0x0000FF00, 5.0f, 0.0f},      // would still hit: held back
+      {10.0f, 0.25f, 0, 1, 0, 7u << 16, 4.5f, -0.25f},     // colour envelopes stay in charge
+      {10.0f, 0.25f, 0, 0, 1, 0x01010101, 4.0f, -1.0f}};   // off: colour left alone
+  SetEnvelope(kLinkRedColorEnvelope, {{0.0f, 7.0f}});
+  LinkSmoke();
   Start();
-  StepOnce();
-  EXPECT_TRUE(emitter->ReportCollisions);
-  EXPECT_FALSE(emitter->CollisionResponse);
-  Unlink(kLinkCollisionReportRate);
-  SetValue(kLinkBounceRate, 0.2f);
-  StepOnce();
-  EXPECT_FALSE(emitter->ReportCollisions);
-  EXPECT_EQ(emitter->CollisionReportRate, 0.4f);  // kept
-  EXPECT_TRUE(emitter->CollisionResponse);
-  EXPECT_EQ(emitter->BounceRate, 0.2f);
-  EXPECT_EQ(emitter->AttachRate, 0.0f);
-  EXPECT_EQ(emitter->AttachedLifespan, -1.0f);
-  EXPECT_EQ(emitter->AttachedSlidingHeight, 0.0f);
+  for (const auto& c : cases) {
+    SetSmokeValue(Smoke::kLinkCollisionProbeMinimum, c.ProbeMinimum);
+    SetSmokeValue(Smoke::kLinkApproachSpeedFactor, c.Approach);
+    SetSmokeValue(Smoke::kLinkRecheckCollision, c.Recheck);
+    SetSmokeValue(Smoke::kLinkCollisionEnabled, c.Enabled);
+    SetSmokeValue(Smoke::kLinkDebugColours, c.Debug);
+    Particle& p = PlaceParticle(0, {0.0f, 5.0f, 0.0f}, kDown);
+    p.Size = 1.0f;
+    p.Color = 0x01010101u;
+    StepOnce();
+    EXPECT_EQ(P(0).Color, c.Color);
+    EXPECT_EQ(P(0).Position, D3DXVECTOR3(0.0f, c.Y, 0.0f));
+    EXPECT_EQ(P(0).Velocity.y, c.VelocityY);
+    EXPECT_FALSE(emitter->PlacedBySmokeCollision);
+  }
+}
+
+// Strength 1, envelope 5 at 0 down to 1 at 4: from 2 above the ground the push is 3; none for a
+// hit at the particle itself or for a particle that does not move.
+TEST_F(Collision, TheSurfaceLookAheadPushesAwayFromTheSurfaceAhead) {
+  const D3DXVECTOR3 cases[][3] = {
+      {{0, 2, 0}, kDown, {0, 3, 0}}, {kZero, kDown, kZero}, {{0, 1, 0}, kZero, kZero}};
+  LinkSmoke();
+  SetSmokeEnvelope(Smoke::kLinkForceStrengthEnvelope, {{0.0f, 1.0f}});
+  SetSmokeEnvelope(Smoke::kLinkSurfaceRepulsionEnvelope, {{0.0f, 5.0f}, {4.0f, 1.0f}});
+  Start();
+  for (const auto& c : cases) {
+    PlaceParticle(0, c[0], c[1]);
+    StepOnce();
+    EXPECT_EQ(P(0).SmokeForce, c[2]);
+  }
 }
 
 }  // namespace

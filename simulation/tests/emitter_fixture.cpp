@@ -1,6 +1,7 @@
 #include "simulation/tests/emitter_fixture.h"
 
 #include <algorithm>
+#include <cstdlib>
 
 EmitterTest::EmitterTest() : device(MemoryDevice::Create()) {
   deviceChannel = std::make_unique<Tev_DX8_DeviceChannel>(device);
@@ -19,37 +20,22 @@ EmitterTest::~EmitterTest() {
 
 Qen_ValueChannel* EmitterTest::SetValue(int link, float value) {
   auto* channel = static_cast<Qen_ValueChannel*>(emitter->GetChild(link));
-  if (!channel) {
-    channel = Make<Qen_ValueChannel>(value);
-    EXPECT_TRUE(emitter->SetChild(link, channel)) << "link " << link;
-  }
+  if (!channel) channel = Link(*emitter, link, Make<Qen_ValueChannel>(value));
   channel->SetValue(value);
   return channel;
 }
 
 Qen_ValueVectorChannel* EmitterTest::SetVector(int link, D3DXVECTOR3 vector) {
   auto* channel = static_cast<Qen_ValueVectorChannel*>(emitter->GetChild(link));
-  if (!channel) {
-    channel = Make<Qen_ValueVectorChannel>(vector);
-    EXPECT_TRUE(emitter->SetChild(link, channel)) << "link " << link;
-  }
+  if (!channel) channel = Link(*emitter, link, Make<Qen_ValueVectorChannel>(vector));
   channel->SetVector(vector);
   return channel;
 }
 
-Qen_MatrixChannel* EmitterTest::SetMatrix(int link, const D3DXMATRIX& matrix) {
-  auto* channel = Make<Qen_MatrixChannel>(matrix);
-  EXPECT_TRUE(emitter->SetChild(link, channel)) << "link " << link;
-  return channel;
-}
-
-Tev_EnvelopeStorage* EmitterTest::SetEnvelope(int link, std::vector<std::pair<float, float>> keys) {
+Tev_EnvelopeStorage* EmitterTest::SetEnvelope(int link, const Keys& keys) {
   auto* envelope = Make<Tev_EnvelopeStorage>();
   for (const auto& [x, y] : keys) envelope->AddKey(x, y);
-  if (link >= 0) {
-    EXPECT_TRUE(emitter->SetChild(link, envelope)) << "link " << link;
-  }
-  return envelope;
+  return link >= 0 ? Link(*emitter, link, envelope) : envelope;
 }
 
 Tev_DX8_ObjectDataChannel* EmitterTest::SetEmitterMesh(const std::vector<D3DXVECTOR3>& vertices,
@@ -57,15 +43,14 @@ Tev_DX8_ObjectDataChannel* EmitterTest::SetEmitterMesh(const std::vector<D3DXVEC
                                                        const std::vector<D3DXVECTOR3>& normals) {
   auto* mesh = Make<Tev_DX8_ObjectDataChannel>();
   mesh->SetVertexCount(static_cast<int>(vertices.size()));
-  for (std::size_t v = 0; v < vertices.size(); ++v) {
-    mesh->SetVertexPosition(vertices[v], static_cast<int>(v));
-    mesh->SetVertexNormal(v < normals.size() ? normals[v] : D3DXVECTOR3(0.0f, 1.0f, 0.0f),
-                          static_cast<int>(v));
+  for (int v = 0; v < static_cast<int>(vertices.size()); ++v) {
+    mesh->SetVertexPosition(vertices[v], v);
+    mesh->SetVertexNormal(v < static_cast<int>(normals.size()) ? normals[v] : D3DXVECTOR3(0, 1, 0),
+                          v);
   }
   mesh->SetIndexCount(static_cast<int>(indices.size()));
-  for (std::size_t i = 0; i < indices.size(); ++i) mesh->SetIndex(indices[i], static_cast<int>(i));
-  EXPECT_TRUE(emitter->SetChild(kLinkEmitter, mesh));
-  return mesh;
+  for (int i = 0; i < static_cast<int>(indices.size()); ++i) mesh->SetIndex(indices[i], i);
+  return Link(*emitter, kLinkEmitter, mesh);
 }
 
 void EmitterTest::LinkBasics(float count, float logicPerSecond, float birthsPerSecond) {
@@ -78,13 +63,14 @@ void EmitterTest::LinkBasics(float count, float logicPerSecond, float birthsPerS
   SetValue(kLinkLifespanMax, 100.0f);
   D3DXMATRIX identity;
   D3DXMatrixIdentity(&identity);
-  SetMatrix(kLinkEmitterMotion, identity);
+  Link(*emitter, kLinkEmitterMotion, Make<Qen_MatrixChannel>(identity));
   SetEmitterMesh({{0.0f, 0.0f, 0.0f}}, {});
 }
 
-void EmitterTest::Start() {
-  emitter->CallChannel();
-  ASSERT_TRUE(emitter->Initialized);
+Tev_MultiCollisionManager* EmitterTest::LinkGround() {
+  auto* manager = Make<Tev_MultiCollisionManager>();
+  EXPECT_EQ(manager->AddPlane({0.0f, 0.0f, 0.0f}, {0.0f, 1.0f, 0.0f}), 0);
+  return Link(*emitter, kLinkMultiCollisionManager, manager);
 }
 
 void EmitterTest::RunFrame(double ms) {
@@ -93,39 +79,21 @@ void EmitterTest::RunFrame(double ms) {
   emitter->CallChannel();
 }
 
-void EmitterTest::RunFrames(int frames, double ms) {
-  for (int i = 0; i < frames; ++i) RunFrame(ms);
-}
-
-void EmitterTest::StepOnce() {
-  // 21 ms banked in all: one step of 20 ms, 1 ms left over.
-  RunFrame(21.0 - static_cast<double>(emitter->LogicAccumulator));
-}
-
-Tev_AdvPE_SmokeSettings* EmitterTest::LinkSmoke() {
-  auto* smoke = Make<Tev_AdvPE_SmokeSettings>();
-  EXPECT_TRUE(emitter->SetChild(kLinkSmokeSettings, smoke));
+void EmitterTest::LinkSmoke() {
+  Link(*emitter, kLinkSmokeSettings, Make<Smoke>());
   SetValue(kLinkSmoke, 1.0f);
-  return smoke;
 }
 
 void EmitterTest::SetSmokeValue(int link, float value) {
-  auto* smoke = static_cast<Tev_AdvPE_SmokeSettings*>(emitter->GetChild(kLinkSmokeSettings));
-  ASSERT_NE(smoke, nullptr);
+  auto* smoke = static_cast<Smoke*>(emitter->GetChild(kLinkSmokeSettings));
   auto* channel = static_cast<Qen_ValueChannel*>(smoke->GetChild(link));
-  if (!channel) {
-    channel = Make<Qen_ValueChannel>(value);
-    ASSERT_TRUE(smoke->SetChild(link, channel)) << "smoke link " << link;
-  }
+  if (!channel) channel = Link(*smoke, link, Make<Qen_ValueChannel>(value));
   channel->SetValue(value);
 }
 
-Tev_EnvelopeStorage* EmitterTest::SetSmokeEnvelope(int link,
-                                                   std::vector<std::pair<float, float>> keys) {
-  auto* smoke = static_cast<Tev_AdvPE_SmokeSettings*>(emitter->GetChild(kLinkSmokeSettings));
-  Tev_EnvelopeStorage* envelope = SetEnvelope(-1, std::move(keys));
-  EXPECT_TRUE(smoke && smoke->SetChild(link, envelope)) << "smoke link " << link;
-  return envelope;
+void EmitterTest::SetSmokeEnvelope(int link, const Keys& keys) {
+  auto* smoke = static_cast<Smoke*>(emitter->GetChild(kLinkSmokeSettings));
+  Link(*smoke, link, SetEnvelope(-1, keys));
 }
 
 int EmitterTest::ActiveCount() const {
@@ -137,19 +105,18 @@ Particle& EmitterTest::PlaceParticle(int index, D3DXVECTOR3 position, D3DXVECTOR
                                      float lifespan) {
   Particle& p = P(index);
   p = Particle{};
-  p.Active = true;
-  p.Bouncing = true;
-  p.Position = position;
-  p.RenderPosition = position;
+  p.Active = p.Bouncing = true;
+  p.Position = p.RenderPosition = position;
   p.Velocity = velocity;
   p.Lifespan = lifespan;
   p.SizeMultiplier = 1.0f;
   return p;
 }
 
-int EmitterTest::CountMessages(const std::vector<std::string>& messages,
-                               const std::string& text) const {
-  return static_cast<int>(std::count(messages.begin(), messages.end(), text));
+void ExpectNear(const D3DXVECTOR3& actual, const D3DXVECTOR3& expected, float tolerance) {
+  EXPECT_NEAR(actual.x, expected.x, tolerance);
+  EXPECT_NEAR(actual.y, expected.y, tolerance);
+  EXPECT_NEAR(actual.z, expected.z, tolerance);
 }
 
 std::vector<int> RandSequence(unsigned seed, int count) {
@@ -161,7 +128,6 @@ std::vector<int> RandSequence(unsigned seed, int count) {
 }
 
 int DrawsTaken(const std::vector<int>& sequence) {
-  const int next = std::rand();
-  const auto at = std::find(sequence.begin(), sequence.end(), next);
+  const auto at = std::find(sequence.begin(), sequence.end(), std::rand());
   return at == sequence.end() ? -1 : static_cast<int>(at - sequence.begin());
 }

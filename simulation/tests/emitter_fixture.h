@@ -2,7 +2,7 @@
 // channels, driven frame by frame through CallChannel.
 #pragma once
 
-#include <cstdlib>
+#include <algorithm>
 #include <memory>
 #include <string>
 #include <utility>
@@ -15,11 +15,15 @@
 #include "host/envelope_storage.h"
 #include "host/host_context.h"
 #include "host/link_channels.h"
+#include "host/multi_collision_manager.h"
 #include "host/object_data_channel.h"
 #include "host/smoke_settings.h"
 #include "platform/memory_device.h"
 #include "plugin/advanced_particle_emitter.h"
 #include "plugin/link_table.h"
+
+using Keys = std::vector<std::pair<float, float>>;
+using Smoke = Tev_AdvPE_SmokeSettings;
 
 class EmitterTest : public ::testing::Test {
  protected:
@@ -29,49 +33,56 @@ class EmitterTest : public ::testing::Test {
   // A channel the fixture owns for the test's length.
   template <typename T, typename... Args>
   T* Make(Args&&... args) {
-    auto channel = std::make_unique<T>(std::forward<Args>(args)...);
-    T* raw = channel.get();
-    channels_.push_back(std::move(channel));
-    return raw;
+    channels_.push_back(std::make_unique<T>(std::forward<Args>(args)...));
+    return static_cast<T*>(channels_.back().get());
   }
 
+  // Links `child` at `owner`'s link.
+  template <typename T>
+  T* Link(Qen_Channel& owner, int link, T* child) {
+    EXPECT_TRUE(owner.SetChild(link, child)) << "link " << link;
+    return child;
+  }
   // Links a channel of the link's type, or sets the one already linked there.
   Qen_ValueChannel* SetValue(int link, float value);
   Qen_ValueVectorChannel* SetVector(int link, D3DXVECTOR3 vector);
-  Qen_MatrixChannel* SetMatrix(int link, const D3DXMATRIX& matrix);
   // A new envelope through (x, y) keys, linked at `link` (or unlinked for link -1).
-  Tev_EnvelopeStorage* SetEnvelope(int link, std::vector<std::pair<float, float>> keys);
+  Tev_EnvelopeStorage* SetEnvelope(int link, const Keys& keys);
   void Unlink(int link) { emitter->ClearChild(link); }
-
-  // A mesh of the given vertices and index entries, linked as the "Emitter".
+  // A mesh linked as the "Emitter"; normals default to (0, 1, 0).
   Tev_DX8_ObjectDataChannel* SetEmitterMesh(const std::vector<D3DXVECTOR3>& vertices,
                                             const std::vector<DWORD>& indices,
                                             const std::vector<D3DXVECTOR3>& normals = {});
-
   // A running emitter: `count` records, logic steps and births per second, active, with one
   // emitter vertex at the origin, vertex emission and a lifespan of 100 s.
   void LinkBasics(float count, float logicPerSecond, float birthsPerSecond);
+  // A ground plane y = 0 facing up, linked as the "MultiCollisionManager".
+  Tev_MultiCollisionManager* LinkGround();
 
   // The first call, which only initializes.
-  void Start();
+  void Start() { emitter->CallChannel(); }
   // One host frame of `ms` milliseconds of real time.
   void RunFrame(double ms);
-  void RunFrames(int frames, double ms);
+  void RunFrames(int frames, double ms) {
+    for (int i = 0; i < frames; ++i) RunFrame(ms);
+  }
   // One frame that runs exactly one logic step at 50 steps per second (20 ms).
-  void StepOnce();
+  void StepOnce() { RunFrame(1000.0 * StepSeconds()); }
+  float StepSeconds() const { return (21.0f - emitter->LogicAccumulator) / 1000.0f; }
 
   // A smoke settings channel linked at "SmokeSettings" with "Smoke?" on, and its own links.
-  Tev_AdvPE_SmokeSettings* LinkSmoke();
+  void LinkSmoke();
   void SetSmokeValue(int link, float value);
-  Tev_EnvelopeStorage* SetSmokeEnvelope(int link, std::vector<std::pair<float, float>> keys);
+  void SetSmokeEnvelope(int link, const Keys& keys);
 
   Particle& P(int index) { return emitter->Particles.at(static_cast<std::size_t>(index)); }
   int ActiveCount() const;
   // A live record placed by hand (for stage tests that start from a known state).
   Particle& PlaceParticle(int index, D3DXVECTOR3 position, D3DXVECTOR3 velocity,
                           float lifespan = 100.0f);
-
-  int CountMessages(const std::vector<std::string>& messages, const std::string& text) const;
+  static int CountMessages(const std::vector<std::string>& messages, const std::string& text) {
+    return static_cast<int>(std::count(messages.begin(), messages.end(), text));
+  }
 
   Qen_HostContext context;
   Qen_HostContext::ScopedCurrent current{&context};
@@ -88,6 +99,9 @@ class EmitterTest : public ::testing::Test {
   // Declared last: destroyed first, while everything it links still lives.
   std::unique_ptr<Tev_AdvancedParticleEmitter> emitter;
 };
+
+// Each component within `tolerance`.
+void ExpectNear(const D3DXVECTOR3& actual, const D3DXVECTOR3& expected, float tolerance = 1e-5f);
 
 // The first `count` values rand() gives after srand(seed); srand(seed) is called again afterwards
 // so that the code under test sees the same sequence.

@@ -1,10 +1,10 @@
-// The live update: death, forces scaled by the time scale, the speed limit, attractors, spin and
-// the dispatch between live, attached and free records.
-#include <cmath>
-
+// The live update: death, forces scaled by the time scale, the speed limit, attractors, spin, and
+// the smoke forces (pairs, strength, drag, fades).
 #include "simulation/tests/emitter_fixture.h"
 
 namespace {
+
+constexpr D3DXVECTOR3 kZero{0.0f, 0.0f, 0.0f};
 
 // Particles placed by hand, no births, 50 logic steps per second.
 class Motion : public EmitterTest {
@@ -14,167 +14,161 @@ class Motion : public EmitterTest {
 
 TEST_F(Motion, AParticleLivesWhileItsAgeEqualsItsLifespanAndDiesAfter) {
   Start();
-  PlaceParticle(0, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 0.0f}, 0.25f);
+  PlaceParticle(0, kZero, kZero, 0.25f);
   RunFrame(250.0);
   EXPECT_TRUE(P(0).Active);
-  EXPECT_EQ(P(0).Age, 0.25f);
   EXPECT_EQ(P(0).NormalizedAge, 1.0f);
   RunFrame(20.0);
   EXPECT_FALSE(P(0).Active);
 }
 
-TEST_F(Motion, NormalizedAgeIsAgeOverLifespan) {
-  Start();
-  PlaceParticle(0, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 0.0f}, 2.0f);
-  RunFrame(500.0);
-  EXPECT_EQ(P(0).NormalizedAge, 0.5f / 2.0f);
-}
-
-TEST_F(Motion, GlobalForceIsScaledTwiceByTheTimeScale) {
+// Each step adds the force times the scale twice; the limit (times the scale) cuts only a
+// strictly faster velocity, keeping its direction.
+TEST_F(Motion, ForcesAndTheSpeedLimitFollowTheTimeScale) {
+  const struct {
+    float Limit;  // negative: no "Maximum Speed" link
+    float Scaler;
+    D3DXVECTOR3 Velocity, Expected;
+  } cases[] = {{-1.0f, 2.0f, {0, 0, 0}, {0, -4, 0}}, {-1.0f, 1.0f, {0, 600, 0}, {0, 599, 0}},
+               {5.0f, 1.0f, {3, 5, 0}, {3, 4, 0}},   {5.0f, 1.0f, {0, 7, 0}, {0, 5, 0}},
+               {5.0f, 1.0f, {6, 9, 0}, {3, 4, 0}},   {5.0f, 2.0f, {0, 14, 0}, {0, 10, 0}}};
   SetVector(kLinkGlobalForce, {0.0f, -1.0f, 0.0f});
-  SetValue(kLinkSimulationScaler, 2.0f);
   Start();
-  PlaceParticle(0, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 0.0f});
-  StepOnce();
-  EXPECT_EQ(P(0).Velocity, D3DXVECTOR3(0.0f, -4.0f, 0.0f));
-  EXPECT_EQ(P(0).Position, D3DXVECTOR3(0.0f, -4.0f, 0.0f));
-  StepOnce();
-  EXPECT_EQ(P(0).Velocity, D3DXVECTOR3(0.0f, -8.0f, 0.0f));
-  EXPECT_EQ(P(0).Position, D3DXVECTOR3(0.0f, -12.0f, 0.0f));
-}
-
-struct SpeedCase {
-  const char* Name;
-  float Limit;  // negative: no "Maximum Speed" link
-  float Scaler;
-  D3DXVECTOR3 Velocity;
-  D3DXVECTOR3 Expected;
-};
-
-class SpeedLimit : public Motion, public ::testing::WithParamInterface<SpeedCase> {};
-
-TEST_P(SpeedLimit, CutsOnlyFasterVelocitiesKeepingTheirDirection) {
-  const SpeedCase& c = GetParam();
-  if (c.Limit >= 0.0f) SetValue(kLinkMaximumSpeed, c.Limit);
-  SetValue(kLinkSimulationScaler, c.Scaler);
-  Start();
-  PlaceParticle(0, {0.0f, 0.0f, 0.0f}, c.Velocity);
-  StepOnce();
-  EXPECT_FLOAT_EQ(P(0).Velocity.x, c.Expected.x);
-  EXPECT_FLOAT_EQ(P(0).Velocity.y, c.Expected.y);
-  EXPECT_FLOAT_EQ(P(0).Velocity.z, c.Expected.z);
-}
-
-INSTANTIATE_TEST_SUITE_P(
-    Cases, SpeedLimit,
-    ::testing::Values(
-        SpeedCase{"EqualIsKept", 5.0f, 1.0f, {3.0f, 4.0f, 0.0f}, {3.0f, 4.0f, 0.0f}},
-        SpeedCase{"FasterIsCut", 5.0f, 1.0f, {0.0f, 6.0f, 0.0f}, {0.0f, 5.0f, 0.0f}},
-        SpeedCase{"DiagonalIsCut", 5.0f, 1.0f, {6.0f, 8.0f, 0.0f}, {3.0f, 4.0f, 0.0f}},
-        SpeedCase{"LimitScales", 5.0f, 2.0f, {0.0f, 0.0f, 12.0f}, {0.0f, 0.0f, 10.0f}},
-        SpeedCase{"NoLinkNoLimit", -1.0f, 1.0f, {0.0f, 600.0f, 0.0f}, {0.0f, 600.0f, 0.0f}}),
-    [](const auto& info) { return std::string(info.param.Name); });
-
-TEST_F(Motion, AttractorsAreSummedAtTheNewPositionAndActInTheNextStep) {
-  Tev_AdvPE_Attractor* attractors[3];
-  const D3DXVECTOR3 centres[3] = {{5.0f, 0.0f, 0.0f}, {0.0f, 7.0f, 0.0f}, {-3.0f, 0.0f, 4.0f}};
-  for (int a = 0; a < 3; ++a) {
-    attractors[a] = Make<Tev_AdvPE_Attractor>();
-    attractors[a]->Position = centres[a];
-    attractors[a]->Strength = 2.0f + static_cast<float>(a);
-    ASSERT_TRUE(emitter->AddChild(kLinkAttractors, attractors[a]));
+  for (const auto& c : cases) {
+    c.Limit < 0.0f ? Unlink(kLinkMaximumSpeed) : (void)SetValue(kLinkMaximumSpeed, c.Limit);
+    SetValue(kLinkSimulationScaler, c.Scaler);
+    PlaceParticle(0, kZero, c.Velocity);
+    StepOnce();
+    ExpectNear(P(0).Velocity, c.Expected);
+    EXPECT_EQ(P(0).Position, P(0).Velocity);
   }
+}
+
+// Summed at the new position, skipping a channel that went away, applied in the next step;
+// sliding particles are immune only with "Sliding Particles Attractor Immunity?".
+TEST_F(Motion, AttractorsAreSummedAtTheNewPositionAndActInTheNextStep) {
+  Tev_AdvPE_Attractor* attractors[2] = {Make<Tev_AdvPE_Attractor>(), Make<Tev_AdvPE_Attractor>()};
+  attractors[0]->Position = {5.0f, 0.0f, 0.0f};
+  attractors[1]->Position = {-3.0f, 0.0f, 4.0f};
+  attractors[1]->Strength = 3.0f;
+  ASSERT_TRUE(emitter->AddChild(kLinkAttractors, attractors[0]));
   {
-    // A channel that went away leaves a null entry, which is skipped.
     Tev_AdvPE_Attractor gone;
     ASSERT_TRUE(emitter->AddChild(kLinkAttractors, &gone));
   }
+  ASSERT_TRUE(emitter->AddChild(kLinkAttractors, attractors[1]));
   SetValue(kLinkSimulationScaler, 0.5f);
   Start();
   PlaceParticle(0, {1.0f, 1.0f, 1.0f}, {0.0f, 0.0f, 0.5f});
+  PlaceParticle(1, kZero, kZero).Sliding = true;
   StepOnce();
-  const D3DXVECTOR3 at = P(0).Position;
-  ASSERT_EQ(at, D3DXVECTOR3(1.0f, 1.0f, 1.5f));
-  D3DXVECTOR3 sum{0.0f, 0.0f, 0.0f};
-  for (Tev_AdvPE_Attractor* attractor : attractors) sum += attractor->GetForceAtPosition(at);
+  const D3DXVECTOR3 at{1.0f, 1.0f, 1.5f};
+  const D3DXVECTOR3 sum =
+      attractors[0]->GetForceAtPosition(at) + attractors[1]->GetForceAtPosition(at);
   EXPECT_EQ(P(0).AttractorForce, sum);
-
-  StepOnce();
-  const D3DXVECTOR3 expected = D3DXVECTOR3(0.0f, 0.0f, 0.5f) + sum * 0.5f * 0.5f;
-  EXPECT_FLOAT_EQ(P(0).Velocity.x, expected.x);
-  EXPECT_FLOAT_EQ(P(0).Velocity.y, expected.y);
-  EXPECT_FLOAT_EQ(P(0).Velocity.z, expected.z);
-}
-
-TEST_F(Motion, SlidingParticlesIgnoreAttractorsOnlyWhenImmune) {
-  auto* attractor = Make<Tev_AdvPE_Attractor>();
-  attractor->Position = {0.0f, 5.0f, 0.0f};
-  ASSERT_TRUE(emitter->AddChild(kLinkAttractors, attractor));
-  Start();
-  PlaceParticle(0, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 0.0f}).Sliding = true;
-  PlaceParticle(1, {1.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 0.0f});
-  StepOnce();
-  EXPECT_NE(P(0).AttractorForce, D3DXVECTOR3(0.0f, 0.0f, 0.0f));
-
+  EXPECT_NE(P(1).AttractorForce, kZero);
   SetValue(kLinkSlidingAttractorImmunity, 1.0f);
   StepOnce();
-  StepOnce();
-  EXPECT_EQ(P(0).AttractorForce, D3DXVECTOR3(0.0f, 0.0f, 0.0f));
-  EXPECT_NE(P(1).AttractorForce, D3DXVECTOR3(0.0f, 0.0f, 0.0f));
+  ExpectNear(P(0).Velocity, D3DXVECTOR3(0.0f, 0.0f, 0.5f) + sum * 0.25f);
+  EXPECT_EQ(P(1).AttractorForce, kZero);
 }
 
-struct SpinCase {
-  float Angle;
-  float Speed;
-  float Scaler;
-  float Expected;
+// The angle is reset (not wrapped) strictly beyond +-360; the speed is scaled. "SpinStart" alone
+// switches spin on.
+TEST_F(Motion, SpinAddsTheScaledSpeedAndResetsBeyond360) {
+  const float cases[][4] = {// angle, speed, scale, expected
+                            {359, 2, 1, 0},
+                            {-359, -2, 1, 0},
+                            {358, 2, 1, 360},
+                            {10, 1.5f, 2, 13}};
+  SetValue(kLinkSpinStart, 0.0f);
+  Start();
+  for (const auto& c : cases) {
+    SetValue(kLinkSimulationScaler, c[2]);
+    Particle& p = PlaceParticle(0, kZero, kZero);
+    p.SpinAngle = c[0];
+    p.SpinSpeed = c[1];
+    StepOnce();
+    EXPECT_EQ(P(0).SpinAngle, c[3]) << c[0];
+  }
+}
+
+class SmokeForces : public Motion {
+ protected:
+  void SetUp() override {
+    Motion::SetUp();
+    LinkSmoke();
+  }
 };
 
-class SpinStep : public Motion, public ::testing::WithParamInterface<SpinCase> {};
-
-TEST_P(SpinStep, AddsScaledSpeedAndResetsBeyondThreeHundredSixty) {
-  SetValue(kLinkSpinStart, 0.0f);
-  SetValue(kLinkSimulationScaler, GetParam().Scaler);
+// Strength 2 (its envelope at the lower index's age 0.5), a pair at distance d along x. The lower
+// index gathers its share for its next step; the higher one uses its share in the same step.
+TEST_F(SmokeForces, PairsActOnceEquallyAndOppositelyStrictlyInsideTheEnvelopesRange) {
+  const struct {
+    int Envelope;
+    float Distance;
+    bool PartnerActive;
+    float Force;  // on the lower index, along x
+  } cases[] = {{Smoke::kLinkRepulsionEnvelope, 1.0f, true, -6.0f},
+               {Smoke::kLinkRepulsionEnvelope, 0.5f, true, 0.0f},  // range start
+               {Smoke::kLinkRepulsionEnvelope, 2.0f, true, 0.0f},  // range end
+               {Smoke::kLinkRepulsionEnvelope, 0.0f, true, 0.0f},  // coincident
+               {Smoke::kLinkRepulsionEnvelope, 1.0f, false, 0.0f},
+               {Smoke::kLinkAttractionEnvelope, 1.0f, true, 6.0f}};
   Start();
-  Particle& p = PlaceParticle(0, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 0.0f});
-  p.SpinAngle = GetParam().Angle;
-  p.SpinSpeed = GetParam().Speed;
-  StepOnce();
-  EXPECT_EQ(P(0).SpinAngle, GetParam().Expected);
+  for (const auto& c : cases) {
+    LinkSmoke();
+    SetSmokeEnvelope(Smoke::kLinkForceStrengthEnvelope, {{0.0f, 0.0f}, {1.0f, 4.0f}});
+    SetSmokeEnvelope(c.Envelope, {{0.5f, 3.0f}, {2.0f, 3.0f}});
+    PlaceParticle(0, kZero, kZero, 2.0f).Age = 1.0f - StepSeconds();
+    PlaceParticle(1, {c.Distance, 0.0f, 0.0f}, kZero).Active = c.PartnerActive;
+    StepOnce();
+    ExpectNear(P(0).SmokeForce, {c.Force, 0.0f, 0.0f}, 1e-4f);
+    ExpectNear(P(1).Velocity, {c.PartnerActive ? -c.Force : 0.0f, 0.0f, 0.0f}, 1e-4f);
+  }
 }
 
-INSTANTIATE_TEST_SUITE_P(Cases, SpinStep,
-                         ::testing::Values(SpinCase{359.0f, 2.0f, 1.0f, 0.0f},
-                                           SpinCase{-359.0f, -2.0f, 1.0f, 0.0f},
-                                           SpinCase{358.0f, 2.0f, 1.0f, 360.0f},
-                                           SpinCase{10.0f, 1.5f, 2.0f, 13.0f}));
-
-TEST_F(Motion, WithoutSpinTheAngleStays) {
+// Drag applies below 1 (faded by age when asked), even without a strength envelope, which leaves
+// every pair force out; the global force and the limit fade with age when asked.
+TEST_F(SmokeForces, DragAndFadesScaleWithAge) {
+  const struct {
+    float Drag, DragFades, ForceFades, SpeedFades;
+    D3DXVECTOR3 Velocity, Expected;  // at normalized age 0.75
+  } cases[] = {{0.5f, 0, 0, 0, {0, 0, 4}, {0, 0, 2}},
+               {1.0f, 0, 0, 0, {0, 0, 4}, {0, 0, 4}},
+               {0.5f, 1, 0, 0, {0, 0, 4}, {0, 0, 0.5f}},
+               {1.0f, 0, 1, 0, {0, 0, 0}, {0, -2, 0}},
+               {1.0f, 0, 0, 1, {0, 0, 9}, {0, 0, 2.5f}}};
+  SetVector(kLinkGlobalForce, {0.0f, -8.0f, 0.0f});
+  SetValue(kLinkMaximumSpeed, 10.0f);
+  SetSmokeEnvelope(Smoke::kLinkRepulsionEnvelope, {{0.0f, 1.0f}, {2.0f, 1.0f}});
   Start();
-  Particle& p = PlaceParticle(0, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 0.0f});
-  p.SpinAngle = 5.0f;
-  p.SpinSpeed = 1.0f;
-  p.RenderSpinAngle = 5.5f;
-  StepOnce();
-  EXPECT_EQ(P(0).SpinAngle, 5.0f);
-  EXPECT_EQ(P(0).RenderSpinAngle, 5.5f);
+  for (const auto& c : cases) {
+    SetSmokeValue(Smoke::kLinkDrag, c.Drag);
+    SetSmokeValue(Smoke::kLinkDragFadesWithAge, c.DragFades);
+    SetSmokeValue(Smoke::kLinkGlobalForceFadesWithAge, c.ForceFades);
+    SetSmokeValue(Smoke::kLinkMaxSpeedFadesWithAge, c.SpeedFades);
+    SetVector(kLinkGlobalForce, {0.0f, c.ForceFades ? -8.0f : 0.0f, 0.0f});
+    PlaceParticle(0, kZero, c.Velocity, 1.0f).Age = 0.75f - StepSeconds();
+    PlaceParticle(1, {1.0f, 0.0f, 0.0f}, kZero);
+    StepOnce();
+    ExpectNear(P(0).Velocity, c.Expected, 1e-4f);
+    EXPECT_EQ(P(0).SmokeForce, kZero);
+  }
 }
 
-TEST_F(Motion, FreeRecordsAreNotUpdated) {
+TEST_F(Motion, SmokeNeedsBothTheSwitchAndTheSettings) {
+  LinkSmoke();
+  SetSmokeValue(Smoke::kLinkDrag, 0.5f);
+  SetValue(kLinkSmoke, 0.0f);
   Start();
-  Particle& p = PlaceParticle(0, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 1.0f});
-  p.Active = false;
+  PlaceParticle(0, kZero, {0.0f, 0.0f, 4.0f});
   StepOnce();
-  EXPECT_EQ(P(0).Position, D3DXVECTOR3(0.0f, 0.0f, 0.0f));
-  EXPECT_FALSE(emitter->VerticesDirty);
-}
-
-TEST_F(Motion, ColourIsRecomputedEveryStepFromTheEnvelopes) {
-  SetEnvelope(kLinkRedColorEnvelope, {{0.0f, 0.0f}, {1.0f, 200.0f}});
-  Start();
-  PlaceParticle(0, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 0.0f}, 1.0f).Color = 0xFFFFFFFFu;
-  RunFrame(500.0);  // NormalizedAge 0.5 in the last step
-  EXPECT_EQ(P(0).Color, 100u << 16);
+  SetValue(kLinkSmoke, 1.0f);
+  StepOnce();
+  Unlink(kLinkSmokeSettings);
+  StepOnce();
+  EXPECT_EQ(P(0).Velocity.z, 2.0f);
 }
 
 }  // namespace
