@@ -1,103 +1,52 @@
 // The type and link records: constructor bytes, name truncation and the plug-in filler.
-#include <gtest/gtest.h>
-
+#include <algorithm>
 #include <cstring>
-#include <string>
 
-#include "host/channel_records.h"
-#include "host/plugin_exports.h"
+#include "host/tests/test_channels.h"
 #include "host/type_guids.h"
 
 namespace {
 
-// Bytes [begin, end) of a record all hold `value`.
-struct ByteRange {
-  std::size_t begin;
-  std::size_t end;
-  std::uint8_t value;
-};
-
+// Every byte of `record` against runs of (end offset, value) that tile it from offset 0.
 template <typename Record>
-void ExpectBytes(const Record& record, std::initializer_list<ByteRange> ranges) {
+void ExpectBytes(const Record& record, std::initializer_list<std::pair<std::size_t, int>> runs) {
   const auto* bytes = reinterpret_cast<const std::uint8_t*>(&record);
-  std::size_t covered = 0;
-  for (const ByteRange& range : ranges) {
-    EXPECT_EQ(range.begin, covered) << "ranges must tile the record";
-    for (std::size_t i = range.begin; i < range.end; ++i)
-      EXPECT_EQ(bytes[i], range.value) << "byte " << i;
-    covered = range.end;
-  }
-  EXPECT_EQ(covered, sizeof(Record));
+  std::size_t i = 0;
+  for (const auto& [end, value] : runs)
+    for (; i < end; ++i) EXPECT_EQ(bytes[i], value) << "byte " << i;
+  EXPECT_EQ(i, sizeof(Record));
 }
 
-TEST(ChannelRecords, ChannelTypeConstructorZeroesEveryByte) {
-  ExpectBytes(ChannelType(), {{0, 132, 0x00}});
+TEST(ChannelRecords, ConstructorsGiveTheHostDefaults) {
+  ExpectBytes(ChannelType(), {{132, 0}});
+  // Name 0, both GUIDs 0x11, reserved 0, position -1, flags, name and trailing GUID 0, then the
+  // words 0 and 1 (little-endian).
+  ExpectBytes(ChildCreation(),
+              {{80, 0}, {112, 0x11}, {132, 0}, {136, 0xFF}, {260, 0}, {261, 1}, {264, 0}});
 }
 
-TEST(ChannelRecords, ChildCreationConstructorBytes) {
-  ExpectBytes(ChildCreation(), {
-                                   {0, 80, 0x00},     // type name
-                                   {80, 112, 0x11},   // type and base type GUIDs
-                                   {112, 132, 0x00},  // reserved, word, reserved
-                                   {132, 136, 0xFF},  // link position -1
-                                   {136, 138, 0x00},  // flag bytes
-                                   {138, 240, 0x00},  // link name
-                                   {240, 256, 0x00},  // trailing GUID
-                                   {256, 260, 0x00},  // word 0
-                                   {260, 261, 0x01},  // word 1, little-endian
-                                   {261, 264, 0x00},
-                               });
-}
-
-TEST(ChannelRecords, PatternGuidHasEveryByte0x11) {
-  const GUID guid = PatternGuid11();
-  const auto* bytes = reinterpret_cast<const std::uint8_t*>(&guid);
-  for (std::size_t i = 0; i < sizeof(GUID); ++i) EXPECT_EQ(bytes[i], 0x11) << i;
-}
-
-struct NameCase {
-  std::size_t length;
-  std::size_t kept;
-};
-
-class TypeNameTruncation : public ::testing::TestWithParam<NameCase> {};
-
-TEST_P(TypeNameTruncation, KeepsAtMost79CharactersAndTerminates) {
-  ChannelType record;
-  std::memset(record.TypeName, 'z', sizeof(record.TypeName));  // stale bytes must go
-  const std::string name(GetParam().length, 'n');
-  record.SetTypeName(name.c_str());
-  EXPECT_EQ(std::string(record.TypeName), std::string(GetParam().kept, 'n'));
-  for (std::size_t i = GetParam().kept; i < sizeof(record.TypeName); ++i)
-    EXPECT_EQ(record.TypeName[i], '\0') << i;
-}
-
-INSTANTIATE_TEST_SUITE_P(Lengths, TypeNameTruncation,
-                         ::testing::Values(NameCase{0, 0}, NameCase{5, 5}, NameCase{79, 79},
-                                           NameCase{80, 79}, NameCase{300, 79}));
-
-TEST(ChannelRecords, LinkNameKeepsAtMost101Characters) {
-  ChildCreation record;
-  record.SetLinkName(std::string(150, 'L').c_str());
-  EXPECT_EQ(std::strlen(record.LinkName), 101u);
-  record.SetLinkName("Emitter");
-  EXPECT_STREQ(record.LinkName, "Emitter");
-  record.SetLinkName(nullptr);
-  EXPECT_STREQ(record.LinkName, "");
+TEST(ChannelRecords, NamesAreTruncatedAndLeaveNoStaleBytes) {
+  ChannelType type;
+  std::memset(type.TypeName, 'z', sizeof(type.TypeName));
+  type.SetTypeName(std::string(300, 'n').c_str());
+  EXPECT_TRUE(type.TypeName[78] == 'n' && type.TypeName[79] == '\0');
+  type.SetTypeName("ab");
+  EXPECT_TRUE(std::all_of(type.TypeName + 2, type.TypeName + 80, [](char c) { return c == 0; }));
+  ChildCreation link;
+  link.SetLinkName(std::string(150, 'L').c_str());
+  EXPECT_TRUE(link.LinkName[100] == 'L' && link.LinkName[101] == '\0');
 }
 
 TEST(ChannelRecords, FillTypeRecordWritesOnlyItsFields) {
   ChannelType record;
   std::memset(record.Reserved112, 0xAB, sizeof(record.Reserved112));
-  std::memset(record.Reserved124, 0xCD, sizeof(record.Reserved124));
+  std::memset(record.Reserved124, 0xAB, sizeof(record.Reserved124));
   ape_plugin::FillTypeRecord(&record, "3D ObjectData", kObjectDataGuid, kDeviceChannelGuid, 7);
-
   EXPECT_STREQ(record.TypeName, "3D ObjectData");
-  EXPECT_EQ(record.TypeGuid, kObjectDataGuid);
-  EXPECT_EQ(record.BaseTypeGuid, kDeviceChannelGuid);
+  EXPECT_TRUE(record.TypeGuid == kObjectDataGuid && record.BaseTypeGuid == kDeviceChannelGuid);
   EXPECT_EQ(record.TypeWord, 7u);
   for (std::uint8_t byte : record.Reserved112) EXPECT_EQ(byte, 0xAB);
-  for (std::uint8_t byte : record.Reserved124) EXPECT_EQ(byte, 0xCD);
+  for (std::uint8_t byte : record.Reserved124) EXPECT_EQ(byte, 0xAB);
 }
 
 }  // namespace

@@ -1,13 +1,23 @@
-// Channels and fixtures shared by the host framework tests.
+// Channels, fixtures and checks shared by the host tests.
 #pragma once
 
 #include <gtest/gtest.h>
 
+#include <limits>
+#include <memory>
+#include <string>
+#include <vector>
+
 #include "host/channel_records.h"
+#include "host/device_channel.h"
 #include "host/host_context.h"
 #include "host/plugin_exports.h"
 #include "host/qen_channel.h"
+#include "platform/d3dx_math.h"
+#include "platform/memory_device.h"
 
+inline constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
+inline constexpr float kInf = std::numeric_limits<float>::infinity();
 inline constexpr GUID kTypeA = GuidFromRegistryText("A0000000-0000-4000-8000-00000000000A");
 inline constexpr GUID kTypeB = GuidFromRegistryText("B0000000-0000-4000-8000-00000000000B");
 inline constexpr GUID kTypeC = GuidFromRegistryText("C0000000-0000-4000-8000-00000000000C");
@@ -25,7 +35,7 @@ class TypedChannel : public Qen_Channel {
 };
 
 // A link declaration accepting `type`; position -1 makes it a many-channel link.
-inline ChildCreation LinkRecord(GUID type, int position, const char* name) {
+inline ChildCreation LinkRecord(GUID type, int position, const char* name = "") {
   ChildCreation record;
   record.Type.TypeGuid = type;
   record.LinkPosition = position;
@@ -39,3 +49,20 @@ class HostContextTest : public ::testing::Test {
   Qen_HostContext context_;
   Qen_HostContext::ScopedCurrent current_{&context_};
 };
+
+// ... whose device channel holds a MemoryDevice.
+class DeviceTest : public HostContextTest {
+ protected:
+  DeviceTest() : device_(MemoryDevice::Create()), device_channel_(device_) {}
+  ~DeviceTest() override { device_->Release(); }
+
+  MemoryDevice* device_;
+  Tev_DX8_DeviceChannel device_channel_;
+};
+
+inline void ExpectNear(const D3DXVECTOR3& actual, const D3DXVECTOR3& expected,
+                       float tolerance = 1e-5f) {
+  EXPECT_NEAR(actual.x, expected.x, tolerance);
+  EXPECT_NEAR(actual.y, expected.y, tolerance);
+  EXPECT_NEAR(actual.z, expected.z, tolerance);
+}

@@ -1,24 +1,19 @@
-// Type GUIDs of the small plug-ins the loader tests build; a test copies a plug-in into a
-// folder of its own under whichever GUID file name the case needs.
+// The loader tests' small plug-ins: test_plugin.cpp built once per variant below, as type
+// TestPluginGuid(variant), into host_test_plugin_<variant>.so.
 #pragma once
+
+#include <cstdint>
 
 #include "platform/windows_types.h"
 
-inline constexpr GUID kDependentPluginGuid =
-    GuidFromRegistryText("D0000001-0000-4000-8000-000000000001");
-inline constexpr GUID kMissingLibraryPluginGuid =
-    GuidFromRegistryText("D0000002-0000-4000-8000-000000000002");
-inline constexpr GUID kUnknownTypePluginGuid =
-    GuidFromRegistryText("D0000003-0000-4000-8000-000000000003");
-inline constexpr GUID kNullInitPluginGuid =
-    GuidFromRegistryText("D0000004-0000-4000-8000-000000000004");
-inline constexpr GUID kNoInitPluginGuid =
-    GuidFromRegistryText("D0000005-0000-4000-8000-000000000005");
-inline constexpr GUID kCycleFirstPluginGuid =
-    GuidFromRegistryText("D0000006-0000-4000-8000-000000000006");
-inline constexpr GUID kCycleSecondPluginGuid =
-    GuidFromRegistryText("D0000007-0000-4000-8000-000000000007");
-inline constexpr GUID kThrowingPluginGuid =
-    GuidFromRegistryText("D0000008-0000-4000-8000-000000000008");
-// Declared as a dependency, but no plug-in has it.
-inline constexpr GUID kNowhereGuid = GuidFromRegistryText("D00000FF-0000-4000-8000-0000000000FF");
+#define TEST_PLUGIN_DEPENDENT 1        // declares a runtime library, two types and itself
+#define TEST_PLUGIN_MISSING_LIBRARY 2  // declares a runtime library nobody has
+#define TEST_PLUGIN_NULL_INIT 3        // InitDLL creates nothing
+#define TEST_PLUGIN_NO_INIT 4          // exports no InitDLL
+#define TEST_PLUGIN_THROWING 5         // DoDependencyInit throws
+#define TEST_PLUGIN_NOWHERE 255        // no plug-in has this type
+
+constexpr GUID TestPluginGuid(int variant) {
+  const auto n = static_cast<std::uint8_t>(variant);
+  return GUID{0xD0000000u + n, 0, 0x4000, {0x80, 0, 0, 0, 0, 0, 0, n}};
+}
