@@ -1,7 +1,9 @@
 #include "platform/gl/tests/gl_test_device.h"
 
+#include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <string>
 
 Argb Channels(std::uint32_t pixel) {
   return Argb{static_cast<int>(pixel >> 24), static_cast<int>((pixel >> 16) & 0xFF),
@@ -9,39 +11,60 @@ Argb Channels(std::uint32_t pixel) {
 }
 
 ::testing::AssertionResult PixelNear(std::uint32_t actual, std::uint32_t expected, int tolerance) {
-  const Argb a = Channels(actual);
-  const Argb e = Channels(expected);
+  const Argb a = Channels(actual), e = Channels(expected);
   if (std::abs(a.a - e.a) <= tolerance && std::abs(a.r - e.r) <= tolerance &&
       std::abs(a.g - e.g) <= tolerance && std::abs(a.b - e.b) <= tolerance) {
     return ::testing::AssertionSuccess();
   }
-  char text[96];
-  std::snprintf(text, sizeof text, "pixel %08X, expected %08X (+-%d per channel)", actual, expected,
-                tolerance);
+  char text[64];
+  std::snprintf(text, sizeof text, "pixel %08X, expected %08X +-%d", actual, expected, tolerance);
   return ::testing::AssertionFailure() << text;
+}
+
+std::vector<ColouredVertex> Quad(float x0, float y0, float x1, float y1, float z, D3DCOLOR colour) {
+  return {{x0, y1, z, colour}, {x1, y1, z, colour}, {x1, y0, z, colour},
+          {x0, y1, z, colour}, {x1, y0, z, colour}, {x0, y0, z, colour}};
+}
+
+std::vector<TexturedVertex> TexturedQuad(D3DCOLOR colour, float z) {
+  return {{-1, 1, z, colour, 0, 0}, {1, 1, z, colour, 1, 0},  {1, -1, z, colour, 1, 1},
+          {-1, 1, z, colour, 0, 0}, {1, -1, z, colour, 1, 1}, {-1, -1, z, colour, 0, 1}};
 }
 
 void GlDeviceTest::SetUp() {
   std::string error;
   device_ = GlDevice::Create(kSize, kSize, &error);
   if (device_ == nullptr) GTEST_SKIP() << "no OpenGL context on this machine: " << error;
+  SetStates({{D3DRS_LIGHTING, FALSE}});
+  ClearTo(kBlack);
 }
 
 void GlDeviceTest::TearDown() {
   for (IUnknown* object : owned_) object->Release();
-  owned_.clear();
-  if (device_ != nullptr) {
-    EXPECT_EQ(device_->LiveObjectCount(), 0);
-    device_->Release();
-  }
+  if (device_ == nullptr) return;
+  EXPECT_EQ(device_->LiveObjectCount(), 0);
+  device_->Release();
+}
+
+void GlDeviceTest::SetStates(std::initializer_list<std::pair<D3DRENDERSTATETYPE, DWORD>> states) {
+  for (const auto& [state, value] : states)
+    EXPECT_EQ(device_->SetRenderState(state, value), S_OK) << state;
+}
+
+void GlDeviceTest::SetStage0(
+    std::initializer_list<std::pair<D3DTEXTURESTAGESTATETYPE, DWORD>> states) {
+  for (const auto& [type, value] : states)
+    EXPECT_EQ(device_->SetTextureStageState(0, type, value), S_OK) << type;
+}
+
+void GlDeviceTest::ClearTo(D3DCOLOR colour, float z) {
+  EXPECT_EQ(device_->Clear(0, nullptr, D3DCLEAR_TARGET | D3DCLEAR_ZBUFFER, colour, z, 0), S_OK);
 }
 
 IDirect3DVertexBuffer9* GlDeviceTest::Upload(const void* vertices, UINT bytes, UINT stride,
                                              DWORD fvf) {
   IDirect3DVertexBuffer9* buffer = nullptr;
-  EXPECT_EQ(device_->CreateVertexBuffer(bytes, D3DUSAGE_WRITEONLY, fvf, D3DPOOL_MANAGED, &buffer,
-                                        nullptr),
-            S_OK);
+  EXPECT_EQ(device_->CreateVertexBuffer(bytes, 0, fvf, D3DPOOL_MANAGED, &buffer, nullptr), S_OK);
   if (buffer == nullptr) return nullptr;
   owned_.push_back(buffer);
   void* data = nullptr;
@@ -53,11 +76,25 @@ IDirect3DVertexBuffer9* GlDeviceTest::Upload(const void* vertices, UINT bytes, U
   return buffer;
 }
 
+IDirect3DIndexBuffer9* GlDeviceTest::MakeIndices(const void* indices, UINT bytes,
+                                                 D3DFORMAT format) {
+  IDirect3DIndexBuffer9* buffer = nullptr;
+  EXPECT_EQ(device_->CreateIndexBuffer(bytes, 0, format, D3DPOOL_MANAGED, &buffer, nullptr), S_OK);
+  if (buffer == nullptr) return nullptr;
+  owned_.push_back(buffer);
+  void* data = nullptr;
+  EXPECT_EQ(buffer->Lock(0, 0, &data, 0), S_OK);
+  std::memcpy(data, indices, bytes);
+  EXPECT_EQ(buffer->Unlock(), S_OK);
+  EXPECT_EQ(device_->SetIndices(buffer), S_OK);
+  return buffer;
+}
+
 IDirect3DTexture9* GlDeviceTest::MakeTexture(UINT width, UINT height,
-                                             const std::vector<D3DCOLOR>& texels) {
+                                             const std::vector<D3DCOLOR>& texels,
+                                             D3DFORMAT format) {
   IDirect3DTexture9* texture = nullptr;
-  EXPECT_EQ(device_->CreateTexture(width, height, 1, 0, D3DFMT_A8R8G8B8, D3DPOOL_MANAGED, &texture,
-                                   nullptr),
+  EXPECT_EQ(device_->CreateTexture(width, height, 1, 0, format, D3DPOOL_MANAGED, &texture, nullptr),
             S_OK);
   if (texture == nullptr) return nullptr;
   owned_.push_back(texture);
@@ -68,11 +105,8 @@ IDirect3DTexture9* GlDeviceTest::MakeTexture(UINT width, UINT height,
                 texels.data() + std::size_t(y) * width, width * sizeof(D3DCOLOR));
   }
   EXPECT_EQ(texture->UnlockRect(0), S_OK);
+  EXPECT_EQ(device_->SetTexture(0, texture), S_OK);
   return texture;
-}
-
-void GlDeviceTest::Unlit() {
-  ASSERT_EQ(device_->SetRenderState(D3DRS_LIGHTING, FALSE), S_OK);
 }
 
 void GlDeviceTest::Read() {
@@ -88,10 +122,4 @@ int GlDeviceTest::CountNear(std::uint32_t colour, int tolerance) const {
   int count = 0;
   for (std::uint32_t p : pixels_) count += PixelNear(p, colour, tolerance) ? 1 : 0;
   return count;
-}
-
-std::vector<ColouredVertex> Quad(float x0, float y0, float x1, float y1, float z, D3DCOLOR colour) {
-  // Clockwise as seen, so that Direct3D's default culling keeps it.
-  return {{x0, y1, z, colour}, {x1, y1, z, colour}, {x1, y0, z, colour},
-          {x0, y1, z, colour}, {x1, y0, z, colour}, {x0, y0, z, colour}};
 }
