@@ -1,5 +1,5 @@
-// The channel base: declared links, type-checked linking, many-channel links, unlinking when a
-// channel goes away, and copies.
+// The channel base: type-checked linking, single and many-channel links, unlinking when a
+// channel goes away, bounded declarations and copies.
 #include <climits>
 
 #include "host/tests/test_channels.h"
@@ -14,16 +14,14 @@ constexpr int kSecondA = 3;
 class ChannelLinks : public HostContextTest {
  protected:
   ChannelLinks() {
-    parent_.SetChildCreationCount(4);
-    parent_.SetChildCreateType(LinkRecord(kTypeA, kSingleA, "Single A"), kSingleA);
+    parent_.SetChildCreateType(LinkRecord(kTypeA, kSingleA), kSingleA);
     parent_.SetChildCreateType(LinkRecord(kTypeB, -1, "Many B"), kManyB);
-    parent_.SetChildCreateType(LinkRecord(kTypeA, kSecondA, "Second A"), kSecondA);
+    parent_.SetChildCreateType(LinkRecord(kTypeA, kSecondA), kSecondA);
   }
   TypedChannel parent_{kTypeC};
 };
 
 TEST_F(ChannelLinks, SetChildTakesOnlyTheDeclaredTypeOrTypesBasedOnIt) {
-  EXPECT_EQ(parent_.FindChildLinkByName("Second A"), kSecondA);
   for (int index : {INT_MIN, -1, kSingleA, kManyB, kUndeclared, 4, INT_MAX})
     EXPECT_TRUE(!parent_.GetChild(index) && !parent_.GetChildFromLinkPosition(index, 0)) << index;
   struct Case {
@@ -51,14 +49,12 @@ TEST_F(ChannelLinks, SingleLinkHoldsOneAndManyLinkKeepsOrderAndNullEntries) {
   TypedChannel a1(kTypeA), a2(kTypeA), b1(kTypeB), b2(kTypeB);
   ASSERT_TRUE(parent_.SetChild(kSingleA, &a1) && parent_.SetChild(kSingleA, &a2));
   EXPECT_FALSE(parent_.SetChild(kSingleA, &b1));  // refused: the present one stays
-  EXPECT_EQ(parent_.GetChild(kSingleA), &a2);
-  EXPECT_EQ(parent_.GetChildLinkPositionCount(kSingleA), 1);
+  EXPECT_TRUE(parent_.GetChild(kSingleA) == &a2 && parent_.GetChildLinkPositionCount(0) == 1);
   ASSERT_TRUE(parent_.AddChild(kManyB, &b1) && parent_.AddChild(kManyB, nullptr) &&
               parent_.AddChild(kManyB, &b2));
   const Qen_Channel* expected[] = {nullptr, &b1, nullptr, &b2, nullptr};  // positions -1..3
   for (int position = -1; position <= 3; ++position)
     EXPECT_EQ(parent_.GetChildFromLinkPosition(kManyB, position), expected[position + 1]);
-  EXPECT_EQ(parent_.GetChildLinkPositionCount(kManyB), 3);
   EXPECT_FALSE(parent_.AddChild(kSingleA, &a1) || parent_.AddChild(kManyB, &a1));
   ASSERT_TRUE(parent_.SetChild(kManyB, &b2));  // leaves exactly this one
   EXPECT_EQ(parent_.GetChildLinkPositionCount(kManyB), 1);
@@ -77,38 +73,34 @@ TEST_F(ChannelLinks, DestroyedChannelsLeaveNoLinksBehind) {
   }
   auto b = std::make_unique<TypedChannel>(kTypeB);
   TypedChannel b_kept(kTypeB);
-  ASSERT_TRUE(parent_.SetChild(kSingleA, a.get()) && parent_.SetChild(kSecondA, a.get()));
-  ASSERT_TRUE(parent_.AddChild(kManyB, b.get()) && parent_.AddChild(kManyB, &b_kept) &&
+  ASSERT_TRUE(parent_.SetChild(kSingleA, a.get()) && parent_.SetChild(kSecondA, a.get()) &&
+              parent_.AddChild(kManyB, b.get()) && parent_.AddChild(kManyB, &b_kept) &&
               parent_.AddChild(kManyB, b.get()));
   a.reset();
   b.reset();
   EXPECT_TRUE(!parent_.GetChild(kSingleA) && !parent_.GetChild(kSecondA));
-  EXPECT_EQ(parent_.GetChildLinkPositionCount(kManyB), 1);
-  EXPECT_EQ(parent_.GetChild(kManyB), &b_kept);
+  EXPECT_TRUE(parent_.GetChildLinkPositionCount(kManyB) == 1 && parent_.GetChild(1) == &b_kept);
   {
     TypedChannel short_lived(kTypeC);
     short_lived.SetChildCreateType(LinkRecord(kTypeA, -1), 0);
+    short_lived.SetChildCreateType(LinkRecord(kTypeB, -1), 1);
     auto self = std::make_unique<TypedChannel>(kTypeA);
     self->SetChildCreateType(LinkRecord(kTypeA, -1), 0);
     ASSERT_TRUE(self->AddChild(0, self.get()) && short_lived.AddChild(0, self.get()));
     self.reset();
     EXPECT_EQ(short_lived.GetChildLinkPositionCount(0), 0);
-    short_lived.SetChildCreateType(LinkRecord(kTypeB, -1), 1);
     ASSERT_TRUE(short_lived.AddChild(1, &b_kept));
   }  // the parent goes before its child `b_kept`
 }
 
-TEST_F(ChannelLinks, RedeclaringOrShrinkingDropsWhatNoLongerFits) {
-  TypedChannel b(kTypeB);
+TEST_F(ChannelLinks, ShrinkingOrRedeclaringDropsLinksAndDeclarationsAreBounded) {
   auto a = std::make_unique<TypedChannel>(kTypeA);
   ASSERT_TRUE(parent_.SetChild(kSingleA, a.get()) && parent_.SetChild(kSecondA, a.get()));
   parent_.SetChildCreateType(LinkRecord(kTypeB, kSingleA), kSingleA);
   EXPECT_EQ(parent_.GetChild(kSingleA), nullptr);
-  EXPECT_TRUE(parent_.SetChild(kSingleA, &b));
   parent_.SetChildCreationCount(2);
   EXPECT_EQ(parent_.GetChild(kSecondA), nullptr);
-  a.reset();  // must not touch the dropped slot
-  // Counts and indices are bounded, so that no declaration can exhaust memory.
+  a.reset();  // must not touch the dropped slots
   parent_.SetChildCreateType(LinkRecord(kTypeA, 0), Qen_Channel::kMaximumLinkCount);
   parent_.SetChildCreateType(LinkRecord(kTypeA, 0), -1);
   EXPECT_EQ(parent_.GetChildCreationCount(), 2);
@@ -118,15 +110,14 @@ TEST_F(ChannelLinks, RedeclaringOrShrinkingDropsWhatNoLongerFits) {
 
 TEST_F(ChannelLinks, CopiesHaveLinksOfTheirOwnAndKeepTheirParents) {
   auto a = std::make_unique<TypedChannel>(kTypeA);
-  TypedChannel b(kTypeB);
+  TypedChannel b(kTypeB), target(kTypeC), holder(kTypeB);
   ASSERT_TRUE(parent_.SetChild(kSingleA, a.get()) && parent_.AddChild(kManyB, &b));
   auto copy = std::make_unique<TypedChannel>(parent_);
   EXPECT_EQ(copy->FindChildLinkByName("Many B"), kManyB);
-  EXPECT_EQ(context_.GetChannelByType(kTypeC, 1), copy.get());
+  EXPECT_EQ(context_.GetChannelByType(kTypeC, 2), copy.get());
   a.reset();
   EXPECT_TRUE(!copy->GetChild(kSingleA) && !parent_.GetChild(kSingleA));
   // Assignment takes the links, not the parents: the holder still links the target.
-  TypedChannel target(kTypeC), holder(kTypeB);
   holder.SetChildCreateType(LinkRecord(kTypeC, 0), 0);
   ASSERT_TRUE(holder.SetChild(0, &target));
   target = *copy;

@@ -1,7 +1,6 @@
 // The envelope curve: interpolation modes, held ends, key order, the answers for unusual inputs,
 // editing, and the evenly-spaced fast path agreeing with the plain search.
 #include <cfloat>
-#include <cmath>
 #include <cstdlib>
 #include <utility>
 
@@ -42,7 +41,9 @@ TEST_F(Envelope, SamplesFollowTheKeysAndHoldTheEnds) {
        {{0, 0, Mode::Step}, {1, 10}, {2, 20, Mode::Step}},
        {{0.5f, 0}, {1.5f, 15}, {2.5f, 20}}},
       // Equal x keep their given order; at that x the last of them holds.
-      {"equal x", {{1, 5}, {0, 0}, {1, 7}, {2, 2}}, {{0.5f, 2.5f}, {1, 7}, {1.5f, 4.5f}}}};
+      {"equal x", {{1, 5}, {0, 0}, {1, 7}, {2, 2}}, {{0.5f, 2.5f}, {1, 7}, {1.5f, 4.5f}}},
+      // Worked without overflow: y0 + (y1 - y0) / 2 in float would be infinite.
+      {"extreme keys", {{-FLT_MAX, -FLT_MAX, Mode::Smooth}, {FLT_MAX, FLT_MAX}}, {{0, 0}}}};
   for (const Case& c : cases) {
     SCOPED_TRACE(c.name);
     envelope_.SetKeys(c.keys);
@@ -69,13 +70,6 @@ TEST_F(Envelope, KeysStaySortedAndFiniteThroughEveryEdit) {
   EXPECT_EQ(envelope_.GetKeyCount(), 4);
   envelope_.SetKeys({{0, 1}, {kNaN, 2}, {1, -kInf}, {2, 3}});
   EXPECT_EQ(KeyPoints(), (Points{{0, 1}, {2, 3}}));
-}
-
-TEST_F(Envelope, ExtremeKeysNeitherOverflowNorLeaveTheirRange) {
-  envelope_.SetKeys({{-FLT_MAX, -FLT_MAX, Mode::Smooth}, {FLT_MAX, FLT_MAX}});
-  for (float x : {-1e38f, 0.0f, 3e38f}) EXPECT_TRUE(std::isfinite(envelope_.GetEnvelopeValue(x)));
-  EXPECT_NEAR(envelope_.GetEnvelopeValue(0.0f), 0.0f, 1e30f);
-  EXPECT_EQ(envelope_.GetEnvelopeValue(FLT_MAX), FLT_MAX);
 }
 
 // Evenly spaced keys take a direct lookup after Initialize; it must give exactly what the

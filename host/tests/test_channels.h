@@ -12,7 +12,6 @@
 #include "host/device_channel.h"
 #include "host/host_context.h"
 #include "host/plugin_exports.h"
-#include "host/qen_channel.h"
 #include "platform/d3dx_math.h"
 #include "platform/memory_device.h"
 
@@ -55,14 +54,12 @@ class DeviceTest : public HostContextTest {
  protected:
   DeviceTest() : device_(MemoryDevice::Create()), device_channel_(device_) {}
   ~DeviceTest() override { device_->Release(); }
-
   MemoryDevice* device_;
   Tev_DX8_DeviceChannel device_channel_;
 };
 
-inline void ExpectNear(const D3DXVECTOR3& actual, const D3DXVECTOR3& expected,
-                       float tolerance = 1e-5f) {
-  EXPECT_NEAR(actual.x, expected.x, tolerance);
-  EXPECT_NEAR(actual.y, expected.y, tolerance);
-  EXPECT_NEAR(actual.z, expected.z, tolerance);
+inline void ExpectNear(const D3DXVECTOR3& actual, const D3DXVECTOR3& expected) {
+  EXPECT_NEAR(actual.x, expected.x, 1e-5f);
+  EXPECT_NEAR(actual.y, expected.y, 1e-5f);
+  EXPECT_NEAR(actual.z, expected.z, 1e-5f);
 }
