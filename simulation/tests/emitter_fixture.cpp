@@ -18,9 +18,10 @@ EmitterTest::~EmitterTest() {
   device->Release();
 }
 
-Qen_ValueChannel* EmitterTest::SetValue(int link, float value) {
-  auto* channel = static_cast<Qen_ValueChannel*>(emitter->GetChild(link));
-  if (!channel) channel = Link(*emitter, link, Make<Qen_ValueChannel>(value));
+Qen_ValueChannel* EmitterTest::SetValue(int link, float value, Qen_Channel* owner) {
+  if (!owner) owner = emitter.get();
+  auto* channel = static_cast<Qen_ValueChannel*>(owner->GetChild(link));
+  if (!channel) channel = Link(*owner, link, Make<Qen_ValueChannel>(value));
   channel->SetValue(value);
   return channel;
 }
@@ -32,10 +33,10 @@ Qen_ValueVectorChannel* EmitterTest::SetVector(int link, D3DXVECTOR3 vector) {
   return channel;
 }
 
-Tev_EnvelopeStorage* EmitterTest::SetEnvelope(int link, const Keys& keys) {
+Tev_EnvelopeStorage* EmitterTest::SetEnvelope(int link, const Keys& keys, Qen_Channel* owner) {
   auto* envelope = Make<Tev_EnvelopeStorage>();
   for (const auto& [x, y] : keys) envelope->AddKey(x, y);
-  return link >= 0 ? Link(*emitter, link, envelope) : envelope;
+  return Link(owner ? *owner : *emitter, link, envelope);
 }
 
 Tev_DX8_ObjectDataChannel* EmitterTest::SetEmitterMesh(const std::vector<D3DXVECTOR3>& vertices,
@@ -67,33 +68,15 @@ void EmitterTest::LinkBasics(float count, float logicPerSecond, float birthsPerS
   SetEmitterMesh({{0.0f, 0.0f, 0.0f}}, {});
 }
 
-Tev_MultiCollisionManager* EmitterTest::LinkGround() {
-  auto* manager = Make<Tev_MultiCollisionManager>();
-  EXPECT_EQ(manager->AddPlane({0.0f, 0.0f, 0.0f}, {0.0f, 1.0f, 0.0f}), 0);
-  return Link(*emitter, kLinkMultiCollisionManager, manager);
-}
-
 void EmitterTest::RunFrame(double ms) {
   clock.AdvanceMs(ms);
   context.AdvanceFrame();
   emitter->CallChannel();
 }
 
-void EmitterTest::LinkSmoke() {
-  Link(*emitter, kLinkSmokeSettings, Make<Smoke>());
+Smoke* EmitterTest::LinkSmoke() {
   SetValue(kLinkSmoke, 1.0f);
-}
-
-void EmitterTest::SetSmokeValue(int link, float value) {
-  auto* smoke = static_cast<Smoke*>(emitter->GetChild(kLinkSmokeSettings));
-  auto* channel = static_cast<Qen_ValueChannel*>(smoke->GetChild(link));
-  if (!channel) channel = Link(*smoke, link, Make<Qen_ValueChannel>(value));
-  channel->SetValue(value);
-}
-
-void EmitterTest::SetSmokeEnvelope(int link, const Keys& keys) {
-  auto* smoke = static_cast<Smoke*>(emitter->GetChild(kLinkSmokeSettings));
-  Link(*smoke, link, SetEnvelope(-1, keys));
+  return Link(*emitter, kLinkSmokeSettings, Make<Smoke>());
 }
 
 int EmitterTest::ActiveCount() const {

@@ -2,7 +2,6 @@
 // channels, driven frame by frame through CallChannel.
 #pragma once
 
-#include <algorithm>
 #include <memory>
 #include <string>
 #include <utility>
@@ -43,11 +42,12 @@ class EmitterTest : public ::testing::Test {
     EXPECT_TRUE(owner.SetChild(link, child)) << "link " << link;
     return child;
   }
-  // Links a channel of the link's type, or sets the one already linked there.
-  Qen_ValueChannel* SetValue(int link, float value);
+  // Links a channel of the link's type at the emitter (or `owner`), or sets the one already
+  // linked there.
+  Qen_ValueChannel* SetValue(int link, float value, Qen_Channel* owner = nullptr);
   Qen_ValueVectorChannel* SetVector(int link, D3DXVECTOR3 vector);
-  // A new envelope through (x, y) keys, linked at `link` (or unlinked for link -1).
-  Tev_EnvelopeStorage* SetEnvelope(int link, const Keys& keys);
+  // A new envelope through (x, y) keys, linked at the emitter's (or `owner`'s) link.
+  Tev_EnvelopeStorage* SetEnvelope(int link, const Keys& keys, Qen_Channel* owner = nullptr);
   void Unlink(int link) { emitter->ClearChild(link); }
   // A mesh linked as the "Emitter"; normals default to (0, 1, 0).
   Tev_DX8_ObjectDataChannel* SetEmitterMesh(const std::vector<D3DXVECTOR3>& vertices,
@@ -56,8 +56,6 @@ class EmitterTest : public ::testing::Test {
   // A running emitter: `count` records, logic steps and births per second, active, with one
   // emitter vertex at the origin, vertex emission and a lifespan of 100 s.
   void LinkBasics(float count, float logicPerSecond, float birthsPerSecond);
-  // A ground plane y = 0 facing up, linked as the "MultiCollisionManager".
-  Tev_MultiCollisionManager* LinkGround();
 
   // The first call, which only initializes.
   void Start() { emitter->CallChannel(); }
@@ -71,18 +69,16 @@ class EmitterTest : public ::testing::Test {
   float StepSeconds() const { return (21.0f - emitter->LogicAccumulator) / 1000.0f; }
 
   // A smoke settings channel linked at "SmokeSettings" with "Smoke?" on, and its own links.
-  void LinkSmoke();
-  void SetSmokeValue(int link, float value);
-  void SetSmokeEnvelope(int link, const Keys& keys);
+  Smoke* LinkSmoke();
+  void SetSmokeValue(int link, float value) { SetValue(link, value, Settings()); }
+  void SetSmokeEnvelope(int link, const Keys& keys) { SetEnvelope(link, keys, Settings()); }
+  Qen_Channel* Settings() { return emitter->GetChild(kLinkSmokeSettings); }
 
   Particle& P(int index) { return emitter->Particles.at(static_cast<std::size_t>(index)); }
   int ActiveCount() const;
   // A live record placed by hand (for stage tests that start from a known state).
   Particle& PlaceParticle(int index, D3DXVECTOR3 position, D3DXVECTOR3 velocity,
                           float lifespan = 100.0f);
-  static int CountMessages(const std::vector<std::string>& messages, const std::string& text) {
-    return static_cast<int>(std::count(messages.begin(), messages.end(), text));
-  }
 
   Qen_HostContext context;
   Qen_HostContext::ScopedCurrent current{&context};

@@ -101,19 +101,6 @@ TEST_F(Envelopes, AnAttachedLookIsClampedAndItsSizeScaledOrOffset) {
   }
 }
 
-TEST_F(Envelopes, WithoutAnAttachedLifespanAnAttachedParticleNeverEndsAndItsLookFreezes) {
-  SetEnvelope(kLinkAttachedAlphaOffsetEnvelope, {{0.0f, 0.0f}});
-  SetValue(kLinkAlignToNormals, 1.0f);
-  Start();
-  Particle& p = PlaceAttached();
-  p.Color = 0x01020304u;
-  RunFrames(3, 1000.0);
-  EXPECT_TRUE(P(0).Active);
-  EXPECT_EQ(P(0).Color, 0x01020304u);
-  EXPECT_EQ(P(0).LookAtPoint, D3DXVECTOR3(7.0f, 7.0f, 7.0f));
-  EXPECT_EQ(emitter->GetInactiveParticle(), 1);
-}
-
 // Position (1, 0, 0), velocity (0, 2, 0), t = 0.5: drawn at (1, 1, 0), inactive or not; LookAt
 // (0, 0, 5); surface normal (0, 0, -1).
 TEST_F(Envelopes, InterpolationDrawsAFractionOfTheNextStepAheadAndFacesByTheRules) {
@@ -144,15 +131,6 @@ TEST_F(Envelopes, InterpolationDrawsAFractionOfTheNextStepAheadAndFacesByTheRule
   }
   emitter->InterpolateParticles(0.0f);
   EXPECT_EQ(P(0).RenderPosition, P(0).Position);
-}
-
-TEST_F(Envelopes, WithoutSpinNeitherTheStepNorTheBlendTurnsAParticle) {
-  Start();
-  Particle& p = PlaceParticle(0, kZero, kZero);
-  p.SpinAngle = 5.0f, p.SpinSpeed = 1.0f, p.RenderSpinAngle = 5.5f;
-  RunFrame(30.0);
-  EXPECT_EQ(P(0).SpinAngle, 5.0f);
-  EXPECT_EQ(P(0).RenderSpinAngle, 5.5f);
 }
 
 }  // namespace
