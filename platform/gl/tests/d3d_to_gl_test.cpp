@@ -7,26 +7,11 @@
 #include "platform/gl/d3d_to_gl.h"
 #include "platform/gl/fvf_layout.h"
 #include "platform/gl/point_program.h"
-#include "platform/gl/texture_stage_combine.h"
 #include "platform/memory_device.h"
 
 namespace {
 
-// The blend values that set both factors, and unknown values, which keep the defaults.
-TEST(D3dToGlTest, BlendValuesBeyondTheOneToOneFactorsAndEquations) {
-  const std::tuple<DWORD, DWORD, GLenum, GLenum> cases[] = {
-      {12 /* BOTHSRCALPHA */, D3DBLEND_ONE, GL_SRC_ALPHA, GL_ONE_MINUS_SRC_ALPHA},
-      {13 /* BOTHINVSRCALPHA */, D3DBLEND_ONE, GL_ONE_MINUS_SRC_ALPHA, GL_SRC_ALPHA},
-      {0, 99, GL_ONE, GL_ZERO}};
-  for (const auto& [source, destination, gl_source, gl_destination] : cases) {
-    const BlendFactors f = BlendFactorsFor(source, destination);
-    EXPECT_EQ(std::pair(f.source, f.destination), std::pair(gl_source, gl_destination)) << source;
-  }
-  EXPECT_EQ(BlendEquation(77), GLenum{GL_FUNC_ADD});
-  EXPECT_EQ(CompareFunction(9, GL_ALWAYS), GLenum{GL_ALWAYS});
-}
-
-TEST(D3dToGlTest, PrimitiveCountsBecomeVertexCountsWithoutOverflow) {
+TEST(D3dToGlTest, PrimitiveCountsBecomeVertexCountsAndUnknownValuesKeepDefaults) {
   const std::tuple<D3DPRIMITIVETYPE, UINT, GLenum, std::uint64_t> cases[] = {
       {D3DPT_POINTLIST, 5, GL_POINTS, 5},
       {D3DPT_LINELIST, 5, GL_LINES, 10},
@@ -42,6 +27,14 @@ TEST(D3dToGlTest, PrimitiveCountsBecomeVertexCountsWithoutOverflow) {
     EXPECT_EQ(draw.vertices, vertices) << type << " x " << count;
     EXPECT_TRUE(vertices == 0 || draw.mode == mode) << type;
   }
+  // The blend values that set both factors; unknown values keep Direct3D's defaults.
+  EXPECT_EQ(BlendFactorsFor(12 /* BOTHSRCALPHA */, D3DBLEND_ONE).destination,
+            GLenum{GL_ONE_MINUS_SRC_ALPHA});
+  EXPECT_EQ(BlendFactorsFor(13 /* BOTHINVSRCALPHA */, D3DBLEND_ONE).destination,
+            GLenum{GL_SRC_ALPHA});
+  EXPECT_EQ(BlendFactorsFor(0, 99).destination, GLenum{GL_ZERO});
+  EXPECT_EQ(BlendEquation(77), GLenum{GL_FUNC_ADD});
+  EXPECT_EQ(CompareFunction(9, GL_ALWAYS), GLenum{GL_ALWAYS});
 }
 
 TEST(D3dToGlTest, FvfPartsLieInDirect3DsOrderAndUndrawableFormatsAreRefused) {
@@ -66,41 +59,16 @@ TEST(D3dToGlTest, FvfPartsLieInDirect3DsOrderAndUndrawableFormatsAreRefused) {
   }
 }
 
-// Render states and stage 0's states at Direct3D's defaults, from the reference device.
+// Render states at Direct3D's defaults, from the reference device.
 struct Defaults {
   DWORD rs[kD3DRenderStateCount] = {};
-  DWORD s[kD3DTextureStageStateCount] = {};
   Defaults() {
     MemoryDevice* reference = MemoryDevice::Create();
     for (std::uint32_t i = 0; i < kD3DRenderStateCount; ++i)
       rs[i] = reference->RenderState(static_cast<D3DRENDERSTATETYPE>(i));
-    for (std::uint32_t i = 0; i < kD3DTextureStageStateCount; ++i)
-      s[i] = reference->TextureStageState(0, static_cast<D3DTEXTURESTAGESTATETYPE>(i));
     reference->Release();
   }
 };
-
-TEST(TextureStageCombineTest, ArgumentsModifiersAndScalesBecomeCombineSettings) {
-  Defaults st;
-  st.s[D3DTSS_COLOROP] = D3DTOP_SELECTARG2;
-  st.s[D3DTSS_COLORARG2] = D3DTA_DIFFUSE | 0x10;  // complement
-  st.s[D3DTSS_ALPHAOP] = D3DTOP_MODULATE2X;
-  st.s[D3DTSS_ALPHAARG2] = D3DTA_TFACTOR;
-  Stage0Combine c = DescribeStage0(st.s, true);
-  EXPECT_EQ(
-      std::tuple(c.rgb.mode, c.rgb.source[0], c.rgb.operand[0]),
-      std::tuple(GLenum{GL_REPLACE}, GLenum{GL_PRIMARY_COLOR}, GLenum{GL_ONE_MINUS_SRC_COLOR}));
-  EXPECT_EQ(std::tuple(c.alpha.mode, c.alpha.scale, c.alpha.source[1], c.alpha.operand[0]),
-            std::tuple(GLenum{GL_MODULATE}, 2.0f, GLenum{GL_CONSTANT}, GLenum{GL_SRC_ALPHA}));
-  st.s[D3DTSS_COLOROP] = D3DTOP_SELECTARG1;
-  st.s[D3DTSS_COLORARG1] = D3DTA_TEXTURE | 0x20;  // alpha replicate
-  st.s[D3DTSS_ALPHAOP] = 25;                      // D3DTOP_LERP, not drawn: passes the current
-  c = DescribeStage0(st.s, true);
-  EXPECT_EQ(c.rgb.operand[0], GLenum{GL_SRC_ALPHA});
-  EXPECT_EQ(std::tuple(c.alpha.mode, c.alpha.source[0]),
-            std::tuple(GLenum{GL_REPLACE}, GLenum{GL_PREVIOUS}));
-  EXPECT_FALSE(DescribeStage0(st.s, false).texturing);  // no texture bound
-}
 
 TEST(PointParamsTest, SizeRangeIsOrderedNonNegativeAndWithinTheDriver) {
   // min, max, the driver's largest point; the range expected
@@ -116,18 +84,6 @@ TEST(PointParamsTest, SizeRangeIsOrderedNonNegativeAndWithinTheDriver) {
     EXPECT_EQ(p.min_px, expected_min) << min << " to " << max;
     EXPECT_EQ(p.max_px, expected_max) << min << " to " << max;
   }
-}
-
-// Lit without lights, a vertex keeps its alpha only when its diffuse colour is the material.
-TEST(PointParamsTest, LitAlphaComesFromTheVertexOnlyWhenItsColourIsTheMaterial) {
-  Defaults d;
-  EXPECT_TRUE(DescribePoints(d.rs, true, true, 100, 255).lit_alpha_from_vertex);
-  EXPECT_FALSE(DescribePoints(d.rs, true, false, 100, 255).lit_alpha_from_vertex);
-  d.rs[145] = 0;  // D3DRS_DIFFUSEMATERIALSOURCE = D3DMCS_MATERIAL
-  EXPECT_FALSE(LitAlphaFromVertex(d.rs, true));
-  d.rs[145] = 1;
-  d.rs[D3DRS_COLORVERTEX] = FALSE;
-  EXPECT_FALSE(LitAlphaFromVertex(d.rs, true));
 }
 
 }  // namespace

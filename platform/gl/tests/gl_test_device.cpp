@@ -5,20 +5,16 @@
 #include <cstring>
 #include <string>
 
-Argb Channels(std::uint32_t pixel) {
-  return Argb{static_cast<int>(pixel >> 24), static_cast<int>((pixel >> 16) & 0xFF),
-              static_cast<int>((pixel >> 8) & 0xFF), static_cast<int>(pixel & 0xFF)};
-}
-
 ::testing::AssertionResult PixelNear(std::uint32_t actual, std::uint32_t expected, int tolerance) {
-  const Argb a = Channels(actual), e = Channels(expected);
-  if (std::abs(a.a - e.a) <= tolerance && std::abs(a.r - e.r) <= tolerance &&
-      std::abs(a.g - e.g) <= tolerance && std::abs(a.b - e.b) <= tolerance) {
-    return ::testing::AssertionSuccess();
+  for (int shift = 0; shift < 32; shift += 8) {
+    if (std::abs(int((actual >> shift) & 0xFF) - int((expected >> shift) & 0xFF)) > tolerance) {
+      char text[64];
+      std::snprintf(text, sizeof text, "pixel %08X, expected %08X +-%d", actual, expected,
+                    tolerance);
+      return ::testing::AssertionFailure() << text;
+    }
   }
-  char text[64];
-  std::snprintf(text, sizeof text, "pixel %08X, expected %08X +-%d", actual, expected, tolerance);
-  return ::testing::AssertionFailure() << text;
+  return ::testing::AssertionSuccess();
 }
 
 std::vector<ColouredVertex> Quad(float x0, float y0, float x1, float y1, float z, D3DCOLOR colour) {
@@ -31,11 +27,24 @@ std::vector<TexturedVertex> TexturedQuad(D3DCOLOR colour, float z) {
           {-1, 1, z, colour, 0, 0}, {1, -1, z, colour, 1, 1}, {-1, -1, z, colour, 0, 1}};
 }
 
+namespace {
+
+// Copies `size` bytes into a vertex or index buffer through a lock of all of it.
+template <typename Buffer>
+void Fill(Buffer* buffer, const void* bytes, UINT size) {
+  void* data = nullptr;
+  ASSERT_EQ(buffer->Lock(0, size, &data, 0), S_OK);
+  std::memcpy(data, bytes, size);
+  EXPECT_EQ(buffer->Unlock(), S_OK);
+}
+
+}  // namespace
+
 void GlDeviceTest::SetUp() {
   std::string error;
   device_ = GlDevice::Create(kSize, kSize, &error);
   if (device_ == nullptr) GTEST_SKIP() << "no OpenGL context on this machine: " << error;
-  SetStates({{D3DRS_LIGHTING, FALSE}});
+  SetStates({D3DRS_LIGHTING, FALSE});
   ClearTo(kBlack);
 }
 
@@ -46,15 +55,13 @@ void GlDeviceTest::TearDown() {
   device_->Release();
 }
 
-void GlDeviceTest::SetStates(std::initializer_list<std::pair<D3DRENDERSTATETYPE, DWORD>> states) {
-  for (const auto& [state, value] : states)
-    EXPECT_EQ(device_->SetRenderState(state, value), S_OK) << state;
-}
-
-void GlDeviceTest::SetStage0(
-    std::initializer_list<std::pair<D3DTEXTURESTAGESTATETYPE, DWORD>> states) {
-  for (const auto& [type, value] : states)
-    EXPECT_EQ(device_->SetTextureStageState(0, type, value), S_OK) << type;
+void GlDeviceTest::SetStates(std::initializer_list<DWORD> states_and_values, bool stage0) {
+  const DWORD* v = states_and_values.begin();
+  for (std::size_t i = 0; i + 1 < states_and_values.size(); i += 2) {
+    EXPECT_EQ(stage0 ? device_->SetTextureStageState(0, D3DTEXTURESTAGESTATETYPE(v[i]), v[i + 1])
+                     : device_->SetRenderState(D3DRENDERSTATETYPE(v[i]), v[i + 1]),
+              S_OK);
+  }
 }
 
 void GlDeviceTest::ClearTo(D3DCOLOR colour, float z) {
@@ -67,10 +74,7 @@ IDirect3DVertexBuffer9* GlDeviceTest::Upload(const void* vertices, UINT bytes, U
   EXPECT_EQ(device_->CreateVertexBuffer(bytes, 0, fvf, D3DPOOL_MANAGED, &buffer, nullptr), S_OK);
   if (buffer == nullptr) return nullptr;
   owned_.push_back(buffer);
-  void* data = nullptr;
-  EXPECT_EQ(buffer->Lock(0, bytes, &data, 0), S_OK);
-  std::memcpy(data, vertices, bytes);
-  EXPECT_EQ(buffer->Unlock(), S_OK);
+  Fill(buffer, vertices, bytes);
   EXPECT_EQ(device_->SetStreamSource(0, buffer, 0, stride), S_OK);
   EXPECT_EQ(device_->SetFVF(fvf), S_OK);
   return buffer;
@@ -82,10 +86,7 @@ IDirect3DIndexBuffer9* GlDeviceTest::MakeIndices(const void* indices, UINT bytes
   EXPECT_EQ(device_->CreateIndexBuffer(bytes, 0, format, D3DPOOL_MANAGED, &buffer, nullptr), S_OK);
   if (buffer == nullptr) return nullptr;
   owned_.push_back(buffer);
-  void* data = nullptr;
-  EXPECT_EQ(buffer->Lock(0, 0, &data, 0), S_OK);
-  std::memcpy(data, indices, bytes);
-  EXPECT_EQ(buffer->Unlock(), S_OK);
+  Fill(buffer, indices, bytes);
   EXPECT_EQ(device_->SetIndices(buffer), S_OK);
   return buffer;
 }

@@ -31,11 +31,6 @@ constexpr DWORD kColouredFvf = D3DFVF_XYZ | D3DFVF_DIFFUSE;
 constexpr DWORD kTexturedFvf = D3DFVF_XYZ | D3DFVF_DIFFUSE | D3DFVF_TEX1;
 constexpr DWORD kPointFvf = D3DFVF_XYZ | D3DFVF_PSIZE | D3DFVF_DIFFUSE;
 
-// The channels of an A8R8G8B8 pixel.
-struct Argb {
-  int a, r, g, b;
-};
-Argb Channels(std::uint32_t pixel);
 // Passes when every channel is within `tolerance` of the expected one.
 ::testing::AssertionResult PixelNear(std::uint32_t actual, std::uint32_t expected,
                                      int tolerance = 2);
@@ -55,8 +50,11 @@ class GlDeviceTest : public ::testing::Test {
   void SetUp() override;
   void TearDown() override;
 
-  void SetStates(std::initializer_list<std::pair<D3DRENDERSTATETYPE, DWORD>> states);
-  void SetStage0(std::initializer_list<std::pair<D3DTEXTURESTAGESTATETYPE, DWORD>> states);
+  // Render states, or stage 0's states, from a list of state, value, state, value...
+  void SetStates(std::initializer_list<DWORD> states_and_values, bool stage0 = false);
+  void SetStage0(std::initializer_list<DWORD> states_and_values) {
+    SetStates(states_and_values, true);
+  }
   void ClearTo(D3DCOLOR colour, float z = 1.0f);
   // A vertex buffer holding these vertices, bound to stream 0 with their stride and FVF.
   IDirect3DVertexBuffer9* Upload(const void* vertices, UINT bytes, UINT stride, DWORD fvf);
