@@ -5,7 +5,6 @@
 
 #include <cstdint>
 #include <memory>
-#include <ostream>
 #include <string>
 #include <vector>
 
@@ -16,8 +15,9 @@
 #include "host/link_channels.h"
 #include "platform/memory_device.h"
 #include "plugin/advanced_particle_emitter.h"
+#include "plugin/link_table.h"
 
-void PrintTo(const D3DXVECTOR3& v, std::ostream* os);
+using Calls = std::vector<std::string>;
 
 // A live particle drawn at `position`, facing `look_at`.
 Particle LiveParticle(D3DXVECTOR3 position, D3DXVECTOR3 look_at, float size, std::uint32_t color);
@@ -31,18 +31,16 @@ class RenderTest : public ::testing::Test {
   // Replaces the pool, as Initialize leaves it sized.
   void SetPool(std::vector<Particle> particles);
   // The device log since the last call, as "Name(a, b)" lines; starts it afresh.
-  std::vector<std::string> TakeCalls();
-  // A width x height texture of `format` on `device` whose pixel (x, y) holds pixel(x, y)
-  // (4-byte formats only; others are left zero), held by a texture link channel.
-  Qen_TextureChannel& MakeTexture(MemoryDevice& device, UINT width, UINT height, D3DFORMAT format,
-                                  std::uint32_t (*pixel)(UINT x, UINT y));
-  // Links a texture channel at "Particle Texture" or "Attached Texture".
-  void LinkTexture(int link, Qen_TextureChannel& texture);
-  // A device that is not the emitter's, for sources whose failures are injected separately.
-  MemoryDevice& OtherDevice();
-
+  Calls TakeCalls();
+  // A width x height texture of `format` on `device` (4-byte formats filled with pixel(x, y)),
+  // linked at `link` ("Particle Texture" or "Attached Texture").
+  Qen_TextureChannel& LinkTexture(int link, MemoryDevice& device, UINT width, UINT height,
+                                  std::uint32_t (*pixel)(UINT x, UINT y),
+                                  D3DFORMAT format = D3DFMT_A8R8G8B8);
   // "Name(a, b)" of one call, for building expected logs.
-  static std::string Call(const std::string& name, std::vector<std::uint64_t> args);
+  static std::string Call(const std::string& name, std::vector<std::uint64_t> args) {
+    return DeviceCall{name, std::move(args)}.ToString();
+  }
   std::uint64_t IdOf(const void* object) const { return device_->ObjectId(object); }
 
   Qen_HostContext context_;
@@ -50,16 +48,10 @@ class RenderTest : public ::testing::Test {
   MemoryDevice* device_;
   std::unique_ptr<Tev_DX8_DeviceChannel> device_channel_;
   std::vector<std::unique_ptr<Qen_TextureChannel>> textures_;
-  std::vector<MemoryDevice*> other_devices_;
   std::unique_ptr<Tev_AdvancedParticleEmitter> emitter_;
   std::vector<std::string> messages_;
 };
 
-// Level 0 of a 4-byte-per-pixel texture, read row by row through its own pitch.
-struct TexturePixels {
-  UINT Width = 0;
-  UINT Height = 0;
-  std::vector<std::uint32_t> Pixels;  // row after row, no padding
-  std::uint32_t At(UINT x, UINT y) const { return Pixels[std::size_t{y} * Width + x]; }
-};
-TexturePixels ReadPixels(IDirect3DTexture9& texture);
+// The bytes of a vertex buffer, or of level 0 of a texture row by row through its own pitch.
+std::vector<BYTE> BufferBytes(IDirect3DVertexBuffer9* buffer);
+std::vector<std::uint32_t> TexturePixels(IDirect3DTexture9* texture);
