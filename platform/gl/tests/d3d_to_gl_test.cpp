@@ -42,7 +42,6 @@ TEST(D3dToGlTest, FvfPartsLieInDirect3DsOrderAndUndrawableFormatsAreRefused) {
   const std::tuple<DWORD, UINT, int, int, int, int> drawable[] = {
       {D3DFVF_XYZ | D3DFVF_NORMAL | D3DFVF_DIFFUSE | D3DFVF_TEX1, 36, 12, -1, 24, 28},  // quads
       {D3DFVF_XYZ | D3DFVF_PSIZE | D3DFVF_DIFFUSE, 20, -1, 12, 16, -1},  // point sprites
-      {D3DFVF_XYZ, 12, -1, -1, -1, -1},
       {D3DFVF_XYZ | D3DFVF_SPECULAR | (2u << 8), 32, -1, -1, -1, 16}};
   for (const auto& [fvf, size, normal, point_size, diffuse, texcoords] : drawable) {
     FvfLayout l;

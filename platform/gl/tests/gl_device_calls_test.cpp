@@ -47,12 +47,9 @@ std::vector<std::uint64_t> Script(IDirect3DDevice9* d) {
   r.push_back(d->SetTransform(D3DTS_VIEW, nullptr));
   D3DMATRIX back{};
   r.push_back(d->GetTransform(D3DTS_WORLD, &back));
-  r.push_back(FloatToStateBits(back._42));
   const D3DVIEWPORT9 viewport{0, 0, 8, 8, 0.0f, 1.0f};
   r.push_back(d->SetViewport(&viewport));
-  D3DVIEWPORT9 read_viewport{};
-  r.push_back(d->GetViewport(&read_viewport));
-  r.push_back(read_viewport.Width);
+  r.push_back(d->GetViewport(nullptr));
 
   // The emitter's fading point-sprite pass.
   DWORD src = 0;
@@ -61,6 +58,7 @@ std::vector<std::uint64_t> Script(IDirect3DDevice9* d) {
   r.push_back(src);
   r.push_back(d->SetTexture(0, texture));
   r.push_back(d->SetRenderState(D3DRS_ALPHABLENDENABLE, TRUE));
+  r.push_back(d->SetTextureStageState(0, D3DTSS_ALPHAOP, D3DTOP_MODULATE));
   r.push_back(d->SetStreamSource(0, vb, 0, sizeof(PointVertex)));
   r.push_back(d->SetFVF(kPointFvf));
   r.push_back(d->DrawPrimitive(D3DPT_POINTLIST, 0, 3));
