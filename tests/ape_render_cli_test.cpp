@@ -8,6 +8,7 @@
 #include <sstream>
 
 #include "tests/scene_test_host.h"
+#include "tools/scene/png_io.h"
 
 namespace scenetest {
 namespace {
@@ -27,10 +28,10 @@ std::string ReadFile(const std::string& path) {
 
 class ApeRenderTest : public ::testing::Test {
  protected:
-  RunResult Render(const std::string& arguments) {
-    const std::string command = std::string(APE_RENDER_PROGRAM) + " " + arguments + " >" +
-                                folder_.File("stdout") + " 2>" + folder_.File("stderr") +
-                                " </dev/null";
+  RunResult Render(const std::string& arguments, const std::string& environment = "") {
+    const std::string command = environment + " " + std::string(APE_RENDER_PROGRAM) + " " +
+                                arguments + " >" + folder_.File("stdout") + " 2>" +
+                                folder_.File("stderr") + " </dev/null";
     const int status = std::system(command.c_str());
     return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, ReadFile(folder_.File("stdout")),
             ReadFile(folder_.File("stderr"))};
@@ -104,6 +105,25 @@ TEST_F(ApeRenderTest, NullDeviceWritesStatsAndASummaryOnly) {
   EXPECT_EQ(std::count(stats.begin(), stats.end(), '\n'), 5);  // header and four frames
   EXPECT_FALSE(std::filesystem::exists(Out() + "/frame_0001.png"));
   EXPECT_FALSE(std::filesystem::exists(Out() + "/preview.gif"));
+}
+
+TEST_F(ApeRenderTest, GlDeviceWritesFramesSheetPreviewAndStats) {
+  // No shader cache: see visual_regression_test.cpp.
+  const RunResult run = Render("--frames 3 --size 64x36 --quiet --out " + Out() + " --device gl",
+                               "MESA_SHADER_CACHE_DISABLE=true");
+  if (run.Status == 1 && run.Err.find("no device") != std::string::npos)
+    GTEST_SKIP() << "no OpenGL context: " << run.Err;
+  ASSERT_EQ(run.Status, 0) << run.Err;
+  for (const char* name : {"frame_0001.png", "frame_0002.png", "frame_0003.png",
+                           "contact_sheet.png", "preview.gif", "stats.csv"})
+    EXPECT_TRUE(std::filesystem::exists(Out() + "/" + name)) << name;
+  EXPECT_FALSE(std::filesystem::exists(Out() + "/frame_0004.png"));
+  apescene::Image frame;
+  std::string error;
+  ASSERT_TRUE(apescene::ReadPng(Out() + "/frame_0003.png", &frame, &error)) << error;
+  EXPECT_EQ(frame.Width, 64);
+  EXPECT_EQ(frame.Height, 36);
+  EXPECT_NE(run.Out.find("Written to " + Out() + ": 3 frames"), std::string::npos) << run.Out;
 }
 
 TEST_F(ApeRenderTest, ProgressLinesWhenStderrIsNotATerminal) {
