@@ -11,7 +11,7 @@ void RatioReporter::ReportRuns(const std::vector<Run>& runs) {
     // With repetitions the median stands for the benchmark; without, its only run.
     if (run.run_type == Run::RT_Aggregate && run.aggregate_name != "median") continue;
     cpuSeconds_[run.run_name.str()] =
-        run.GetAdjustedCPUTime() * benchmark::GetTimeUnitMultiplier(run.time_unit);
+        run.GetAdjustedCPUTime() / benchmark::GetTimeUnitMultiplier(run.time_unit);
   }
   benchmark::ConsoleReporter::ReportRuns(runs);
 }

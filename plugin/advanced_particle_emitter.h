@@ -10,6 +10,7 @@
 
 #include "host/object_data_channel.h"
 #include "render/vertex_layouts.h"
+#include "simulation/birth_run.h"
 #include "simulation/logic_step.h"
 #include "simulation/particle.h"
 
@@ -204,6 +205,8 @@ class Tev_AdvancedParticleEmitter : public Tev_DX8_ObjectDataChannel {
 
   // Taken at the start of each logic step and dropped at its end (scratch: never copied).
   sim::LogicStepState Step;
+  // Carried between the births of one frame (scratch: never copied).
+  sim::BirthRunState BirthRun;
 
  private:
   void CopySettingsFrom(const Tev_AdvancedParticleEmitter& other);

@@ -5,6 +5,7 @@
 
 #include "plugin/advanced_particle_emitter.h"
 #include "render/render_sizes.h"
+#include "simulation/vector_math.h"
 
 namespace {
 
@@ -26,15 +27,12 @@ QuadBasis BasisFor(const D3DXVECTOR3& facing) {
   const float ay = std::fabs(facing.y);
   const float az = std::fabs(facing.z);
   QuadBasis basis;
-  D3DXVECTOR3 cross;
   if (ax + az < ay) {
-    D3DXVec3Cross(&cross, &facing, &kRight);
-    D3DXVec3Normalize(&basis.Up, &cross);
-    D3DXVec3Cross(&basis.Right, &basis.Up, &facing);
+    basis.Up = sim::Unit(sim::Cross(facing, kRight));
+    basis.Right = sim::Cross(basis.Up, facing);
   } else {
-    D3DXVec3Cross(&cross, &kUp, &facing);
-    D3DXVec3Normalize(&basis.Right, &cross);
-    D3DXVec3Cross(&basis.Up, &facing, &basis.Right);
+    basis.Right = sim::Unit(sim::Cross(kUp, facing));
+    basis.Up = sim::Cross(facing, basis.Right);
   }
   return basis;
 }
@@ -87,9 +85,7 @@ void Tev_AdvancedParticleEmitter::UpdateLocalVertexBuffer() {
     const D3DXVECTOR3& position = particle.RenderPosition;
     // An inactive slot collapses to a zero-area quad at its render position.
     const float half_size = particle.Active ? particle.Size * kHalfSizeFactor : 0.0f;
-    D3DXVECTOR3 facing;
-    const D3DXVECTOR3 to_look_at = particle.LookAtPoint - position;
-    D3DXVec3Normalize(&facing, &to_look_at);
+    const D3DXVECTOR3 facing = sim::Unit(particle.LookAtPoint - position);
     const HalfExtents extents =
         ExtentsFor(BasisFor(facing), half_size, SpinEnabled, particle.RenderSpinAngle);
     WriteQuad(LocalVertices + 4 * i, position, extents, facing, particle.Color,

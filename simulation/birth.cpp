@@ -9,6 +9,7 @@
 #include "plugin/link_reading.h"
 #include "plugin/link_table.h"
 #include "simulation/envelope_sampling.h"
+#include "simulation/particle_pool.h"
 #include "simulation/vector_math.h"
 
 namespace {
@@ -65,12 +66,18 @@ std::optional<BirthPoint> PickTrianglePoint(Tev_AdvancedParticleEmitter& e,
 }
 
 // The record to use: a free one, else (when replacing) the oldest free-flying one; none when the
-// pool is empty or every record is stuck to a surface.
+// pool is empty or every record is stuck to a surface. Within a frame's births the searches go
+// on from where the last birth's ended (see BirthRunState); a direct call searches afresh.
 int ChooseRecord(Tev_AdvancedParticleEmitter& e) {
-  const int free = e.GetInactiveParticle();
+  sim::BirthRunState& run = e.BirthRun;
+  const int free = run.Running ? sim::FirstInactive(e.Particles, e.ParticleCount, run.FreeFrom)
+                               : e.GetInactiveParticle();
+  // The record found may yet stay free (a birth without a point): the next search starts at it.
+  if (run.Running) run.FreeFrom = free >= 0 ? free : e.ParticleCount;
   if (free >= 0) return free;
   if (!e.ReplaceOldParticles || e.ParticleCount <= 0) return -1;
-  const int oldest = e.GetOldestParticle();
+  const int oldest = run.Running && run.Oldest >= 0 ? run.Oldest : e.GetOldestParticle();
+  if (run.Running) run.Oldest = oldest;
   return e.Particles[oldest].Attached ? -1 : oldest;
 }
 

@@ -40,6 +40,18 @@ void AdvanceActiveTimer(Tev_AdvancedParticleEmitter& e, float seconds) {
   if (e.ActiveTimerElapsed > e.ActiveTimerDuration) e.ActiveTimerOn = false;
 }
 
+// Marks a frame's births for BirthParticle, however they end.
+class BirthRunScope {
+ public:
+  explicit BirthRunScope(Tev_AdvancedParticleEmitter& e) : e_(e) { e.BirthRun = {true, 0, -1}; }
+  ~BirthRunScope() { e_.BirthRun.Running = false; }
+  BirthRunScope(const BirthRunScope&) = delete;
+  BirthRunScope& operator=(const BirthRunScope&) = delete;
+
+ private:
+  Tev_AdvancedParticleEmitter& e_;
+};
+
 void RunBirths(Tev_AdvancedParticleEmitter& e, float ms) {
   // Not above 0 (NaN included): no births, and the bank neither grows nor resets.
   if (!(e.BirthsPerSecond > 0.0f)) return;
@@ -47,6 +59,7 @@ void RunBirths(Tev_AdvancedParticleEmitter& e, float ms) {
   const bool active = IsYes(ValueLink(e, kLinkEmitterActive)->GetValue());
   if (!active && !e.ActiveTimerOn) return;
   e.BirthAccumulator += ms;
+  const BirthRunScope run(e);
   int births = 0;
   while (e.BirthAccumulator > e.BirthInterval) {
     e.BirthAccumulator -= e.BirthInterval;

@@ -29,12 +29,16 @@ bool BuildPool(std::vector<Particle>& pool, std::int32_t count) noexcept {
   }
 }
 
+int FirstInactive(const std::vector<Particle>& pool, int count, int from) {
+  for (int i = from < 0 ? 0 : from; i < count; ++i)
+    if (!pool[i].Active) return i;
+  return -1;
+}
+
 }  // namespace sim
 
 int Tev_AdvancedParticleEmitter::GetInactiveParticle() {
-  for (int i = 0; i < ParticleCount; ++i)
-    if (!Particles[i].Active) return i;
-  return -1;
+  return sim::FirstInactive(Particles, ParticleCount, 0);
 }
 
 int Tev_AdvancedParticleEmitter::GetOldestParticle() {

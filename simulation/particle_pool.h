@@ -21,4 +21,7 @@ PoolRequest PoolSizeFor(float particleCountValue);
 // empty and the answer is false; nothing is thrown.
 bool BuildPool(std::vector<Particle>& pool, std::int32_t count) noexcept;
 
+// The lowest index from `from` on, below `count`, whose record is inactive; -1 when none is.
+int FirstInactive(const std::vector<Particle>& pool, int count, int from);
+
 }  // namespace sim

@@ -28,11 +28,17 @@ inline bool IsFinite(const D3DXVECTOR3& v) {
   return std::isfinite(v.x) && std::isfinite(v.y) && std::isfinite(v.z);
 }
 
-// D3DXVec3Normalize: a zero vector stays zero.
+// D3DXVec3Normalize, inline for the per-particle loops: each component divided by the length,
+// and a zero vector stays zero.
 inline D3DXVECTOR3 Unit(const D3DXVECTOR3& v) {
-  D3DXVECTOR3 out;
-  D3DXVec3Normalize(&out, &v);
-  return out;
+  const float length = Length(v);
+  if (length == 0.0f) return kZeroVector;
+  return {v.x / length, v.y / length, v.z / length};
+}
+
+// D3DXVec3Cross, inline: a x b with the operands in the order given.
+inline D3DXVECTOR3 Cross(const D3DXVECTOR3& a, const D3DXVECTOR3& b) {
+  return {a.y * b.z - a.z * b.y, a.z * b.x - a.x * b.z, a.x * b.y - a.y * b.x};
 }
 
 // `point` moved along the unit `normal` onto the plane through `onPlane`.
