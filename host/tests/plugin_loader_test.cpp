@@ -18,7 +18,7 @@ namespace fs = std::filesystem;
 using ::testing::HasSubstr;
 
 constexpr GUID kDependent = TestPluginGuid(TEST_PLUGIN_DEPENDENT);
-constexpr GUID kNowhere = TestPluginGuid(TEST_PLUGIN_NOWHERE);
+constexpr GUID kNowhere = TestPluginGuid(0xFF);  // no plug-in has this type
 
 fs::path TestPlugin(int variant) {
   return fs::path(HOST_TEST_PLUGIN_DIR) / ("host_test_plugin_" + std::to_string(variant) + ".so");
@@ -37,32 +37,9 @@ class PluginFolderTest : public HostContextTest {
   const fs::path folder_ = fs::temp_directory_path() / ("host-loader-" + std::to_string(getpid()));
 };
 
-// Built-in types need no plug-in; a failed load keeps nothing and may be tried again.
-TEST_F(PluginFolderTest, DependenciesLoadInOrderAndAFailedLoadKeepsNothing) {
-  Install(TestPlugin(TEST_PLUGIN_DEPENDENT), kDependent);
-  PluginLoader loader(folder_.string());
-  std::string error;
-  EXPECT_NE(std::unique_ptr<Qen_Channel>(loader.CreateChannelByName("Matrix", &error)), nullptr);
-  EXPECT_EQ(loader.CreateChannelByName("Loader Test", &error), nullptr);  // not loaded yet
-  EXPECT_THAT(error, HasSubstr("\"Loader Test\""));
-  EXPECT_FALSE(loader.LoadType(kDependent, &error));  // the object data is not there yet
-  EXPECT_THAT(error, HasSubstr(std::string("type ") + kObjectDataGuidText + " needed by plug-in"));
-  EXPECT_EQ(loader.GetTypeRecord(kDependent), nullptr);
-
-  Install(OBJECT_DATA_PLUGIN_FILE, kObjectDataGuid);
-  ASSERT_TRUE(loader.LoadType(kDependent, &error)) << error;
-  EXPECT_NE(loader.GetTypeRecord(kObjectDataGuid), nullptr);
-  const std::vector<Qen_Dependency>& entries = loader.GetDependencies(kDependent)->Entries;
-  ASSERT_EQ(entries.size(), 4u);
-  EXPECT_EQ(entries[0].LibraryName, "libc.so.6");
-  EXPECT_TRUE(entries[1].TypeGuid == kObjectDataGuid && entries[2].TypeGuid == kValueGuid &&
-              entries[3].TypeGuid == kDependent);
-  std::unique_ptr<Qen_Channel> channel(loader.CreateChannelByName("Loader Test", &error));
-  ASSERT_NE(channel, nullptr) << error;
-  EXPECT_EQ(channel->GetChannelType().TypeGuid, kDependent);
-}
-
-TEST_F(PluginFolderTest, EveryFailureAnswersFalseWithAMessageNamingItsCause) {
+// Every failure answers false with a message naming its cause and the type, and keeps nothing
+// loaded; once the missing piece is there, loading succeeds.
+TEST_F(PluginFolderTest, FailuresAreNamedAndDependenciesLoadInOrder) {
   constexpr int kNoFolder = -3, kNothing = -2, kTextFile = -1, kObjectData = 0;
   const std::string nowhere = FormatGuid(kNowhere);
   const fs::path absent = folder_ / "absent";
@@ -79,7 +56,8 @@ TEST_F(PluginFolderTest, EveryFailureAnswersFalseWithAMessageNamingItsCause) {
       {TEST_PLUGIN_NULL_INIT, "created no channel"},
       {TEST_PLUGIN_NO_INIT, "has no InitDLL"},
       {TEST_PLUGIN_MISSING_LIBRARY, "runtime library libape-no-such-runtime.so.9 needed by"},
-      {TEST_PLUGIN_THROWING, "threw: dependency declaration failed"}};
+      {TEST_PLUGIN_THROWING, "threw: dependency declaration failed"},
+      {TEST_PLUGIN_DEPENDENT, std::string("type ") + kObjectDataGuidText + " needed by plug-in"}};
   for (const Case& c : cases) {
     SCOPED_TRACE(c.cause);
     const GUID type = c.installed > 0 ? TestPluginGuid(c.installed) : kNowhere;
@@ -92,7 +70,23 @@ TEST_F(PluginFolderTest, EveryFailureAnswersFalseWithAMessageNamingItsCause) {
     EXPECT_THAT(error, HasSubstr(c.cause));
     EXPECT_THAT(error, HasSubstr(FormatGuid(type)));
     EXPECT_EQ(loader.GetTypeRecord(type), nullptr);
-    EXPECT_EQ(loader.CreateChannel(type, nullptr), nullptr);
+    EXPECT_EQ(loader.CreateChannelByName("Loader Test", &error), nullptr);
+    EXPECT_THAT(error, HasSubstr("\"Loader Test\""));
+  }
+
+  Install(OBJECT_DATA_PLUGIN_FILE, kObjectDataGuid);
+  PluginLoader loader(folder_.string());
+  std::string error;
+  ASSERT_TRUE(loader.LoadType(kDependent, &error)) << error;
+  const std::vector<Qen_Dependency>& entries = loader.GetDependencies(kDependent)->Entries;
+  ASSERT_EQ(entries.size(), 4u);  // the last, its own type, is a cycle that must end
+  EXPECT_EQ(entries[0].LibraryName, "libc.so.6");
+  EXPECT_TRUE(entries[1].TypeGuid == kObjectDataGuid && entries[2].TypeGuid == kValueGuid &&
+              entries[3].TypeGuid == kDependent);
+  EXPECT_NE(loader.GetTypeRecord(kObjectDataGuid), nullptr);
+  for (const char* name : {"Loader Test", "Matrix"}) {  // loaded and built in
+    std::unique_ptr<Qen_Channel> channel(loader.CreateChannelByName(name, &error));
+    EXPECT_NE(channel, nullptr) << error;
   }
 }
 

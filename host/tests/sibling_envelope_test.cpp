@@ -15,11 +15,6 @@ using Points = std::vector<std::pair<float, float>>;
 
 class Envelope : public HostContextTest {
  protected:
-  Points KeyPoints() const {
-    Points points;
-    for (const Key& key : envelope_.GetKeys()) points.emplace_back(key.X, key.Y);
-    return points;
-  }
   Tev_EnvelopeStorage envelope_;
 };
 
@@ -54,44 +49,35 @@ TEST_F(Envelope, SamplesFollowTheKeysAndHoldTheEnds) {
 }
 
 TEST_F(Envelope, KeysStaySortedAndFiniteThroughEveryEdit) {
-  envelope_.SetKeys({{2, 20}, {0, 0}, {1, 10}});
-  envelope_.AddKey(-1, -10);
+  envelope_.SetKeys({{2, 20}, {0, 0}, {kNaN, 2}, {1, 10}, {3, -kInf}});
   envelope_.AddKey(1, 15);  // after the key already at 1
-  EXPECT_EQ(KeyPoints(), (Points{{-1, -10}, {0, 0}, {1, 10}, {1, 15}, {2, 20}}));
-  EXPECT_TRUE(envelope_.GetMinIndex() == -1.0f && envelope_.GetMaxIndex() == 2.0f);
-  EXPECT_FALSE(envelope_.RemoveKey(5) || envelope_.RemoveKey(-1) || envelope_.ReplaceKey(5, {}));
-  EXPECT_TRUE(envelope_.RemoveKey(1));
-  EXPECT_TRUE(envelope_.ReplaceKey(0, {5, 50}));  // moves past the others
-  EXPECT_EQ(KeyPoints(), (Points{{1, 10}, {1, 15}, {2, 20}, {5, 50}}));
-
-  envelope_.AddKey(kNaN, 1);
   envelope_.AddKey(1, kInf);
-  EXPECT_FALSE(envelope_.ReplaceKey(0, {kInf, 0}));  // non-finite keys are refused
-  EXPECT_EQ(envelope_.GetKeyCount(), 4);
-  envelope_.SetKeys({{0, 1}, {kNaN, 2}, {1, -kInf}, {2, 3}});
-  EXPECT_EQ(KeyPoints(), (Points{{0, 1}, {2, 3}}));
+  EXPECT_FALSE(envelope_.RemoveKey(4) || envelope_.RemoveKey(-1) ||
+               envelope_.ReplaceKey(0, {kInf, 0}));
+  EXPECT_TRUE(envelope_.ReplaceKey(0, {5, 50}));  // moves past the others
+  Points keys;
+  for (const Key& key : envelope_.GetKeys()) keys.emplace_back(key.X, key.Y);
+  EXPECT_EQ(keys, (Points{{1, 10}, {1, 15}, {2, 20}, {5, 50}}));
+  EXPECT_TRUE(envelope_.GetMinIndex() == 1.0f && envelope_.GetMaxIndex() == 5.0f);
 }
 
 // Evenly spaced keys take a direct lookup after Initialize; it must give exactly what the
-// search gives, at the keys too.
+// search gives, at the keys too. (The spacing of 0.1f steps has rounding in it.)
 TEST_F(Envelope, EvenlySpacedLookupAgreesWithTheSearch) {
   std::srand(20240601);
+  auto random = [](float range) { return range * static_cast<float>(std::rand()) / RAND_MAX; };
   for (int count : {2, 3, 8, 64}) {
     std::vector<Key> keys;
     for (int i = 0; i < count; ++i)
-      keys.push_back({0.1f * static_cast<float>(i), static_cast<float>(std::rand() % 1000),
-                      static_cast<Mode>(std::rand() % 3)});
+      keys.push_back({0.1f * static_cast<float>(i), random(1000), static_cast<Mode>(i % 3)});
     Tev_EnvelopeStorage searched;
     searched.SetKeys(keys);
     envelope_.SetKeys(keys);
     envelope_.Initialize();
     for (int i = 0; i < 2000; ++i) {
-      const float x = -0.1f + 0.1f * static_cast<float>(count + 1) *
-                                  (static_cast<float>(std::rand()) / static_cast<float>(RAND_MAX));
+      const float x = i < count ? keys[i].X : random(0.1f * static_cast<float>(count + 1)) - 0.1f;
       ASSERT_EQ(envelope_.GetEnvelopeValue(x), searched.GetEnvelopeValue(x)) << count << " " << x;
     }
-    for (const Key& key : keys)
-      ASSERT_EQ(envelope_.GetEnvelopeValue(key.X), searched.GetEnvelopeValue(key.X));
   }
 }
 

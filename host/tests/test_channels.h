@@ -34,11 +34,10 @@ class TypedChannel : public Qen_Channel {
 };
 
 // A link declaration accepting `type`; position -1 makes it a many-channel link.
-inline ChildCreation LinkRecord(GUID type, int position, const char* name = "") {
+inline ChildCreation LinkRecord(GUID type, int position) {
   ChildCreation record;
   record.Type.TypeGuid = type;
   record.LinkPosition = position;
-  record.SetLinkName(name);
   return record;
 }
 

@@ -7,17 +7,19 @@
 
 namespace {
 constexpr GUID kOwnType = TestPluginGuid(TEST_PLUGIN_VARIANT);
-}
+constexpr int kVariant = TEST_PLUGIN_VARIANT;
+}  // namespace
 
 class TestPluginChannel : public Qen_Channel {
  public:
+  TestPluginChannel() {
+    if (kVariant == TEST_PLUGIN_NULL_INIT) throw std::runtime_error("no channel");  // InitDLL: null
+  }
   ChannelType GetChannelType() override;
   void DoDependencyInit(Qen_List* list) override {
-    if (TEST_PLUGIN_VARIANT == TEST_PLUGIN_THROWING)
-      throw std::runtime_error("dependency declaration failed");
-    if (TEST_PLUGIN_VARIANT == TEST_PLUGIN_MISSING_LIBRARY)
-      AddDLLDepend("libape-no-such-runtime.so.9", list);
-    if (TEST_PLUGIN_VARIANT != TEST_PLUGIN_DEPENDENT) return;
+    if (kVariant == TEST_PLUGIN_THROWING) throw std::runtime_error("dependency declaration failed");
+    if (kVariant == TEST_PLUGIN_MISSING_LIBRARY) AddDLLDepend("libape-no-such-runtime.so.9", list);
+    if (kVariant != TEST_PLUGIN_DEPENDENT) return;
     AddDLLDepend("libc.so.6", list);
     AddChannelGuidDepend(kObjectDataGuid, list);
     AddChannelGuidDepend(kValueGuid, list);
@@ -25,20 +27,7 @@ class TestPluginChannel : public Qen_Channel {
   }
 };
 
-#if TEST_PLUGIN_VARIANT == TEST_PLUGIN_NULL_INIT || TEST_PLUGIN_VARIANT == TEST_PLUGIN_NO_INIT
-extern "C" ChannelType* GetType() {
-  static ChannelType record;
-  ape_plugin::FillTypeRecord(&record, "Broken", kOwnType, GUID{}, 0);
-  return &record;
-}
-ChannelType TestPluginChannel::GetChannelType() {
-  return *GetType();
-}
-#if TEST_PLUGIN_VARIANT == TEST_PLUGIN_NULL_INIT
-extern "C" Qen_Channel* InitDLL() {
-  return nullptr;
-}
+#if TEST_PLUGIN_VARIANT == TEST_PLUGIN_NO_INIT
+#define InitDLL NotInitDLL  // the library exports no InitDLL
 #endif
-#else
 APE_CHANNEL_PLUGIN(TestPluginChannel, "Loader Test", kOwnType, GUID{}, 0)
-#endif

@@ -11,7 +11,6 @@
 #define TEST_PLUGIN_NULL_INIT 3        // InitDLL creates nothing
 #define TEST_PLUGIN_NO_INIT 4          // exports no InitDLL
 #define TEST_PLUGIN_THROWING 5         // DoDependencyInit throws
-#define TEST_PLUGIN_NOWHERE 255        // no plug-in has this type
 
 constexpr GUID TestPluginGuid(int variant) {
   const auto n = static_cast<std::uint8_t>(variant);
