@@ -12,7 +12,8 @@
 #endif
 
 #ifdef APE_SOAK_ASAN
-#include <sanitizer/allocator_interface.h>
+// From the sanitizer runtime (GCC ships no header for it).
+extern "C" std::size_t __sanitizer_get_current_allocated_bytes();
 #endif
 
 namespace apefuzz {
