@@ -4,6 +4,7 @@
 //
 // Exit status: 0 done; 1 the device or the output failed; 2 a bad command line or scene file
 // (then nothing is written).
+#include <unistd.h>
 #include <CLI/CLI.hpp>
 
 #include <chrono>
@@ -87,10 +88,12 @@ int Render(const Options& options) {
   Qen_HostContext::ScopedCurrent current(&context);
   std::map<std::string, int> messages;
   int message_count = 0;
+  // Each distinct message once; on a terminal it starts below the progress bar.
+  const char* line_start = isatty(STDERR_FILENO) ? "\n" : "";
   auto collect = [&](const char* text) {
     ++message_count;
     if (messages[text]++ == 0 && !options.quiet)
-      std::fprintf(stderr, "\nape-render: emitter message: %s\n", text);
+      std::fprintf(stderr, "%sape-render: emitter message: %s\n", line_start, text);
   };
   context.DebugMessages.SetSink(collect);
   context.OverloadMessages.SetSink(collect);
@@ -98,7 +101,11 @@ int Render(const Options& options) {
 
   std::unique_ptr<aperender::RenderDevice> device =
       aperender::RenderDevice::Create(options.device, settings.Width, settings.Height, &error);
-  if (device == nullptr) return Fail(kExitFailure, "no device: " + error);
+  if (device == nullptr)
+    return Fail(
+        kExitFailure,
+        "no device: " + error +
+            (options.device == "gl" ? " (--device null renders statistics without pixels)" : ""));
   Tev_DX8_DeviceChannel device_channel(device->Device());
 
   PluginLoader loader;
