@@ -62,4 +62,33 @@ INSTANTIATE_TEST_SUITE_P(
                                 "]]]]]]]]]]]]]]]]]]]]"}),
     [](const auto& info) { return std::string(info.param.Name); });
 
+// Found by the fuzzer: a number beyond the range of a double escaped the loader as an exception,
+// and a control character in a name or string split the message over several lines.
+struct RefusalCase {
+  const char* Name;
+  const char* Text;
+  const char* RefusalStart;  // the message's beginning (a type list may follow)
+};
+
+class Refusal : public testing::TestWithParam<RefusalCase> {};
+
+TEST_P(Refusal, IsOneClearLine) {
+  const apefuzz::SceneOutcome outcome = RunText(GetParam().Text);
+  EXPECT_FALSE(outcome.Loaded);
+  EXPECT_EQ(outcome.Fault, "");
+  const std::string start = GetParam().RefusalStart;
+  EXPECT_EQ(outcome.Refusal.substr(0, start.size()), start);
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Findings, Refusal,
+    testing::Values(
+        RefusalCase{"NumberOverflow", "{\"fps\": 1e400}",
+                    "fuzz.json: number overflow parsing '1e400'"},
+        RefusalCase{"NewlineInName", "{\"channels\": {\"a\\nb\": {\"type\": 5}}}",
+                    "fuzz.json:1: channels.\"a\\nb\".type: expected a string, got a number"},
+        RefusalCase{"ControlInValue", "{\"channels\": {\"a\": {\"type\": \"x\\ty\"}}}",
+                    "fuzz.json:1: channels.a.type: unknown channel type \"x\\x09y\" (known: "}),
+    [](const auto& info) { return std::string(info.param.Name); });
+
 }  // namespace

@@ -24,8 +24,36 @@ std::string SyntaxDetail(const char* what) {
   return colon == std::string::npos ? text : text.substr(colon + 2);
 }
 
+// "[json.exception.out_of_range.406] number overflow parsing '1e400'" without its tag.
+std::string WithoutTag(const char* what) {
+  const std::string text = what;
+  const std::size_t tag_end = text.find("] ");
+  return text.compare(0, 1, "[") == 0 && tag_end != std::string::npos ? text.substr(tag_end + 2)
+                                                                      : text;
+}
+
 std::string WithLine(const std::string& name, int line) {
   return line > 0 ? name + ":" + std::to_string(line) : name;
+}
+
+// The message as one line: control characters (a newline in a channel name or a string value,
+// say) are written as escapes.
+std::string OneLine(const std::string& text) {
+  std::string line;
+  for (const char c : text) {
+    const auto byte = static_cast<unsigned char>(c);
+    if (c == '\n') {
+      line += "\\n";
+    } else if (byte < 0x20 || byte == 0x7F) {
+      static constexpr char kHex[] = "0123456789ABCDEF";
+      line += "\\x";
+      line += kHex[byte >> 4];
+      line += kHex[byte & 0xF];
+    } else {
+      line += c;
+    }
+  }
+  return line;
 }
 
 }  // namespace
@@ -194,8 +222,12 @@ bool Run(const SceneSource& source, std::string* error, Build build) {
   } catch (const Json::parse_error& e) {
     int line = 0, column = 0;
     JsonLocator::LineAndColumn(source.Text, e.byte == 0 ? 0 : e.byte - 1, &line, &column);
-    *error = source.DisplayName + ":" + std::to_string(line) + ":" + std::to_string(column) + ": " +
-             SyntaxDetail(e.what());
+    *error = OneLine(source.DisplayName + ":" + std::to_string(line) + ":" +
+                     std::to_string(column) + ": " + SyntaxDetail(e.what()));
+    return false;
+  } catch (const Json::exception& e) {
+    // Faults the parser gives no position, such as a number beyond the range of a double.
+    *error = OneLine(source.DisplayName + ": " + WithoutTag(e.what()));
     return false;
   }
   const JsonLocator locator(source.Text);
@@ -210,10 +242,10 @@ bool Run(const SceneSource& source, std::string* error, Build build) {
     build(root);
   } catch (const SceneError& e) {
     const std::string where = WithLine(source.DisplayName, locator.LineOf(e.Path()));
-    *error = where + ": " + (e.Path().IsRoot() ? "" : e.Path().Text() + ": ") + e.what();
+    *error = OneLine(where + ": " + (e.Path().IsRoot() ? "" : e.Path().Text() + ": ") + e.what());
     return false;
   } catch (const std::exception& e) {
-    *error = source.DisplayName + ": " + e.what();
+    *error = OneLine(source.DisplayName + ": " + e.what());
     return false;
   }
   return true;
