@@ -72,7 +72,7 @@ TEST_F(Birth, VertexEmissionWritesTheWholeRecordDrawingVertexSizeSpinAndLifespan
   EXPECT_EQ(DrawsTaken(s), 4);
   EXPECT_EQ(p.Color, 0xFF64FF00u);
   EXPECT_EQ(p.Age, 0.101f);  // aged by the frame after its birth
-  EXPECT_EQ(p.SmokeForce, D3DXVECTOR3(0.0f, 0.0f, 0.0f));
+  EXPECT_EQ(p.SmokeForce, kZero);
   EXPECT_FALSE(p.Sliding || p.Attached);
   EXPECT_TRUE(p.Bouncing);
   EXPECT_EQ(p.NormalizedAge, 0.7f);  // left for the first step
@@ -152,7 +152,7 @@ TEST_F(Birth, AFullPoolIsReplacedOnlyWhenAskedAndNeverAtAnAttachedRecord) {
     SetValue(kLinkReplaceOldParticles, c.Replace ? 1.0f : 0.0f);
     const float ages[] = {0.3f, 0.8f, 0.9f, 0.8f};  // a tie keeps the lower index
     for (int i = 0; i < 4; ++i) {
-      PlaceParticle(i, {9.0f, 9.0f, 9.0f}, {0.0f, 0.0f, 0.0f}).Attached = c.Attached[i];
+      PlaceParticle(i, {9.0f, 9.0f, 9.0f}, kZero).Attached = c.Attached[i];
       P(i).NormalizedAge = ages[i];
     }
     const std::vector<int> s = RandSequence(4u, 4);

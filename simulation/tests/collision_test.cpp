@@ -9,7 +9,6 @@ namespace {
 
 constexpr D3DXVECTOR3 kUp{0.0f, 1.0f, 0.0f};
 constexpr D3DXVECTOR3 kDown{0.0f, -1.0f, 0.0f};
-constexpr D3DXVECTOR3 kZero{0.0f, 0.0f, 0.0f};
 
 // Particles placed by hand over the ground, 50 logic steps per second.
 class Collision : public EmitterTest {

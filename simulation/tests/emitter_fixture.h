@@ -23,6 +23,7 @@
 
 using Keys = std::vector<std::pair<float, float>>;
 using Smoke = Tev_AdvPE_SmokeSettings;
+inline constexpr D3DXVECTOR3 kZero{0.0f, 0.0f, 0.0f};
 
 class EmitterTest : public ::testing::Test {
  protected:

@@ -6,8 +6,6 @@
 
 namespace {
 
-constexpr D3DXVECTOR3 kZero{0.0f, 0.0f, 0.0f};
-
 class Envelopes : public EmitterTest {
  protected:
   void SetUp() override { LinkBasics(3.0f, 50.0f, 0.0f); }

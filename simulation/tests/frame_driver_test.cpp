@@ -39,7 +39,7 @@ TEST_F(FrameDriver, FirstCallOnlyInitializesAndLaterCallsInTheSameFrameDoNothing
 TEST_F(FrameDriver, BirthsAndStepsNeedStrictlyMoreThanOneInterval) {
   LinkBasics(20.0f, 50.0f, 10.0f);
   Start();
-  PlaceParticle(19, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 1.0f});
+  PlaceParticle(19, kZero, {0.0f, 0.0f, 1.0f});
   RunFrames(2, 40.0);
   EXPECT_EQ(ActiveCount(), 1);
   RunFrame(20.0);  // 100 ms banked for births and steps: 100 > 100 and 20 > 20 fail
@@ -59,7 +59,7 @@ TEST_F(FrameDriver, BirthsAndStepsNeedStrictlyMoreThanOneInterval) {
 TEST_F(FrameDriver, BirthsAndLogicStepsStopAtTheirCapsWithOneMessageEach) {
   LinkBasics(2000.0f, 1000.0f, 1e6f);
   Start();
-  PlaceParticle(1999, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 1.0f}, 1e6f);
+  PlaceParticle(1999, kZero, {0.0f, 0.0f, 1.0f}, 1e6f);
   RunFrame(2000.0);
   EXPECT_EQ(ActiveCount(), 1002);
   EXPECT_EQ(P(1999).Position.z, 1000.0f);
@@ -150,7 +150,7 @@ TEST_F(FrameDriver, RebuildsOnlyWhenTheCountOrTheDrawingPathReadsDifferently) {
     SetValue(c.Link, c.AtStart);
     emitter->Initialize();
     c.Later ? (void)SetValue(c.Link, *c.Later) : Unlink(c.Link);
-    PlaceParticle(0, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 1.0f});
+    PlaceParticle(0, kZero, {0.0f, 0.0f, 1.0f});
     StepOnce();
     EXPECT_EQ(emitter->Initialized, !c.Rebuilds) << c.Link << " " << c.AtStart;
     EXPECT_EQ(P(0).Position.z, 1.0f);
@@ -163,13 +163,13 @@ TEST_F(FrameDriver, RebuildsOnlyWhenTheCountOrTheDrawingPathReadsDifferently) {
 TEST_F(FrameDriver, AnUnusableLogicRateRunsNoStep) {
   LinkBasics(2.0f, 0.0f, 0.0f);
   Start();
-  PlaceParticle(0, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 1.0f});
+  PlaceParticle(0, kZero, {0.0f, 0.0f, 1.0f});
   RunFrames(2, 50.0);
-  EXPECT_EQ(P(0).RenderPosition, D3DXVECTOR3(0.0f, 0.0f, 0.0f));
+  EXPECT_EQ(P(0).RenderPosition, kZero);
   for (float rate : {0.0f, -5.0f, kNaN}) {
     SetValue(kLinkLogicUpdatesPerSecond, 50.0f);
     emitter->LogicAccumulator = 0.0f;
-    PlaceParticle(0, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 1.0f});
+    PlaceParticle(0, kZero, {0.0f, 0.0f, 1.0f});
     RunFrame(50.0);  // two steps
     SetValue(kLinkLogicUpdatesPerSecond, rate);
     RunFrames(2, 50.0);

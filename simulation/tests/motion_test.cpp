@@ -4,8 +4,6 @@
 
 namespace {
 
-constexpr D3DXVECTOR3 kZero{0.0f, 0.0f, 0.0f};
-
 // Particles placed by hand, no births, 50 logic steps per second.
 class Motion : public EmitterTest {
  protected:

@@ -78,10 +78,10 @@ TEST_F(Pool, QueriesInitializeFirstThenAnswerFromTheRecord) {
   EXPECT_EQ(emitter->GetParticlePosition(1), D3DXVECTOR3(1.0f, 2.0f, 3.0f));
   for (int outside : {-1, 3, std::numeric_limits<int>::min()}) {
     EXPECT_FALSE(emitter->GetIfParticleActive(outside));
-    EXPECT_EQ(emitter->GetParticlePosition(outside), D3DXVECTOR3(0.0f, 0.0f, 0.0f));
+    EXPECT_EQ(emitter->GetParticlePosition(outside), kZero);
   }
   emitter->Initialized = false;
-  EXPECT_EQ(emitter->GetParticlePosition(1), D3DXVECTOR3(0.0f, 0.0f, 0.0f));
+  EXPECT_EQ(emitter->GetParticlePosition(1), kZero);
   EXPECT_TRUE(emitter->Initialized);
 }
 
