@@ -141,29 +141,6 @@ TEST_F(Collision, ASlidingParticleStaysAtItsHeightAndIsNeverReported) {
   EXPECT_EQ(DrawsTaken(s), 0);
 }
 
-// A surface 5 below; speed 1, radius 0.5, approach factor 0.3.
-TEST_F(Collision, SmokeCollisionResponseSlowsBeforeASurfaceWithinTheProbe) {
-  const struct {
-    float ProbeMinimum;
-    D3DXVECTOR3 Direction;
-    bool Linked, Hit;
-  } cases[] = {{10.0f, kDown, true, true},
-               {2.0f, kDown, true, false},
-               {10.0f, kUp, true, false},
-               {10.0f, kDown, false, false}};
-  for (const auto& c : cases) {
-    if (!c.Linked) Unlink(kLinkMultiCollisionManager);
-    D3DXVECTOR3 at{0.0f, 5.0f, 0.0f}, direction = c.Direction, position, velocity, normal;
-    EXPECT_EQ(emitter->SmokeCollisionResponse(c.ProbeMinimum, 0.3f, 0.5f, 1.0f, &at, 1.0f,
-                                              &direction, &position, &velocity, &normal),
-              c.Hit);
-    if (!c.Hit) continue;
-    EXPECT_EQ(velocity, D3DXVECTOR3(0.0f, -0.3f, 0.0f));
-    EXPECT_EQ(position, D3DXVECTOR3(0.0f, 4.7f, 0.0f));
-    EXPECT_EQ(normal, kUp);
-  }
-}
-
 // In contact the motion continues along the surface, never faster than speed x contact factor.
 TEST_F(Collision, SmokeCollisionResponseInContactSlidesAlongTheSurface) {
   const struct {
