@@ -1,5 +1,5 @@
-// The pieces of a render: choosing and laying out contact-sheet frames, shrinking pictures, the
-// GIF file, progress texts, the statistics table, the output folder and the particle census.
+// The pieces of a render: choosing contact-sheet frames, progress texts, the statistics table,
+// the output folder and the particle census. (The sheet's layout is in the golden pictures.)
 #include <gif_lib.h>
 #include <gtest/gtest.h>
 
@@ -10,7 +10,6 @@
 #include "plugin/advanced_particle_emitter.h"
 #include "tests/scene_test_host.h"
 #include "tools/render/contact_sheet.h"
-#include "tools/render/gif_writer.h"
 #include "tools/render/particle_census.h"
 #include "tools/render/progress.h"
 #include "tools/render/render_output.h"
@@ -37,57 +36,6 @@ TEST(ContactSheetTest, FramesAreEvenlySpacedEndingOnTheLast) {
     EXPECT_EQ(aperender::ContactSheetFrames(counts.first, counts.second), expected);
 }
 
-TEST(ContactSheetTest, LaysPicturesOutInRowsWithGaps) {
-  const Image sheet = aperender::BuildContactSheet(
-      {Filled(3, 2, 0xFF0000FFu), Filled(3, 2, 0xFF00FF00u), Filled(3, 2, 0xFFFF0000u)}, 2, 1,
-      0xFF000000u);
-  ASSERT_EQ(sheet.Width, 2 * 3 + 3);
-  ASSERT_EQ(sheet.Height, 2 * 2 + 3);
-  auto at = [&](int x, int y) { return sheet.Argb[static_cast<std::size_t>(y * sheet.Width + x)]; };
-  EXPECT_EQ(at(0, 0), 0xFF000000u);  // gap
-  EXPECT_EQ(at(1, 1), 0xFF0000FFu);  // first, top left
-  EXPECT_EQ(at(5, 2), 0xFF00FF00u);  // second, top right
-  EXPECT_EQ(at(1, 4), 0xFFFF0000u);  // third, next row
-  EXPECT_EQ(at(5, 4), 0xFF000000u);  // no fourth picture
-}
-
-TEST(ShrinkTest, AveragesBoxesOfAWholeFactor) {
-  Image image = Filled(4, 2, 0xFF000000u);
-  image.Argb[0] = 0xFFFFFFFFu;  // one white pixel of the first 2 x 2 box
-  const Image small = apescene::ShrinkToWidth(image, 2);
-  ASSERT_EQ(small.Height, 1);
-  EXPECT_EQ(small.Argb, (std::vector<std::uint32_t>{0xFF404040u, 0xFF000000u}));  // 255 / 4
-  EXPECT_EQ(apescene::ShrinkToWidth(image, 4).Argb, image.Argb);                  // already fits
-  EXPECT_EQ(apescene::ShrinkToWidth(Filled(7, 3, 0), 3).Width, 2);                // factor 3
-}
-
-TEST(GifWriterTest, WritesAnAnimationThatGiflibReadsBack) {
-  TempFolder folder;
-  const std::string path = folder.File("p.gif");
-  std::string error;
-  {
-    aperender::GifWriter gif;
-    ASSERT_TRUE(gif.Open(path, 4, 3, 5, &error)) << error;
-    ASSERT_TRUE(gif.AddFrame(Filled(4, 3, 0xFFFFFFFFu), &error)) << error;
-    ASSERT_TRUE(gif.AddFrame(Filled(4, 3, 0xFF000000u), &error)) << error;
-    EXPECT_FALSE(gif.AddFrame(Filled(5, 3, 0), &error));
-    EXPECT_EQ(error, "GIF frames must all be 4x3");
-    ASSERT_TRUE(gif.Close(&error)) << error;
-  }
-  int code = 0;
-  GifFileType* gif = DGifOpenFileName(path.c_str(), &code);
-  ASSERT_NE(gif, nullptr);
-  ASSERT_EQ(DGifSlurp(gif), GIF_OK);
-  EXPECT_EQ(std::make_pair(gif->SWidth, gif->SHeight), std::make_pair(4, 3));
-  ASSERT_EQ(gif->ImageCount, 2);
-  EXPECT_EQ(gif->SavedImages[0].RasterBits[0], 251);  // white, the last colour of the cube
-  EXPECT_EQ(gif->SavedImages[1].RasterBits[0], 0);
-  GraphicsControlBlock control;
-  ASSERT_EQ(DGifSavedExtensionToGCB(gif, 1, &control), GIF_OK);
-  EXPECT_EQ(control.DelayTime, 5);
-  DGifCloseFile(gif, &code);
-}
-
 TEST(ProgressTest, Texts) {
   EXPECT_EQ(aperender::Progress::BarText(15, 60, 12.34, 3.6),
             "[#######-----------------------] 15/60 frames  12.3 fps  4 s left");
@@ -95,27 +43,6 @@ TEST(ProgressTest, Texts) {
             "ape-render: 60/120 frames, 2.0 fps, 2 min 05 s left");
   EXPECT_EQ(aperender::Progress::LineText(0, 10, 0.0, INFINITY),
             "ape-render: 0/10 frames, 0.0 fps, ? s left");
-}
-
-TEST(ProgressTest, LinesComeEveryFewSecondsAndAtTheEnd) {
-  char* buffer = nullptr;
-  std::size_t size = 0;
-  std::FILE* out = open_memstream(&buffer, &size);
-  double now = 0.0;
-  {
-    aperender::Progress progress(aperender::Progress::Mode::Lines, 4, out, [&] { return now; });
-    // Frame 1 and 3 come too soon after the last line; the last frame always shows.
-    for (const auto& [seconds, frame] : {std::pair{1.0, 1}, {6.0, 2}, {7.0, 3}, {8.0, 4}}) {
-      now = seconds;
-      progress.FrameDone(frame);
-    }
-    progress.Finish();
-  }
-  std::fclose(out);
-  EXPECT_EQ(std::string(buffer, size),
-            "ape-render: 2/4 frames, 0.3 fps, 6 s left\n"
-            "ape-render: 4/4 frames, 0.5 fps, 0 s left\n");
-  std::free(buffer);
 }
 
 aperender::FrameResult Frame(int frame, int live, int births, double channel_ms, double draw_ms) {
