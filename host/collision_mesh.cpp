@@ -27,6 +27,18 @@ void RejectBackFaces(const RTCFilterFunctionNArguments* args) {
   }
 }
 
+// Embree checks its rays (and aborts the process on a failed check): origin and direction
+// components at most its FLT_LARGE in size, and t limits that are not NaN.
+constexpr double kEmbreeLargest = 1.844e18;
+
+bool EmbreeTakes(const CollisionSegment& segment, double max_t) {
+  const double parts[] = {segment.Origin.x, segment.Origin.y, segment.Origin.z,
+                          segment.Ray.x,    segment.Ray.y,    segment.Ray.z};
+  for (double part : parts)
+    if (!(std::fabs(part) <= kEmbreeLargest)) return false;
+  return !std::isnan(max_t);
+}
+
 // Whether the segment, up to max_t, can touch the box at all.
 bool SegmentMeetsBounds(const CollisionSegment& segment, double max_t, const Vec3d& low,
                         const Vec3d& high) {
@@ -148,7 +160,7 @@ bool CollisionMesh::BuildScene(RTCDevice device) {
 
 bool CollisionMesh::Intersect(const CollisionSegment& segment, double max_t,
                               CollisionHit* hit) const {
-  if (!scene_) return IntersectEachTriangle(segment, max_t, hit);
+  if (!scene_ || !EmbreeTakes(segment, max_t)) return IntersectEachTriangle(segment, max_t, hit);
   RTCIntersectContext context;
   rtcInitIntersectContext(&context);
   RTCRayHit query{};

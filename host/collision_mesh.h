@@ -25,6 +25,7 @@ class CollisionMesh {
   CollisionMesh& operator=(const CollisionMesh&) = delete;
 
   // The closest front-face hit with t in [0, max_t], as the shape tests of collision_shapes.h.
+  // Segments beyond the range Embree accepts are searched triangle by triangle.
   bool Intersect(const CollisionSegment& segment, double max_t, CollisionHit* hit) const;
   // The same answer by testing every triangle (ties: the lowest triangle index).
   bool IntersectEachTriangle(const CollisionSegment& segment, double max_t,

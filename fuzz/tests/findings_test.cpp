@@ -9,6 +9,7 @@
 #include "host/envelope_storage.h"
 #include "host/host_context.h"
 #include "host/link_channels.h"
+#include "host/multi_collision_manager.h"
 #include "host/object_data_channel.h"
 #include "platform/memory_device.h"
 #include "plugin/advanced_particle_emitter.h"
@@ -92,6 +93,40 @@ TEST_F(Finding, BirthAfterEnvelopesWentAwayReadsNone) {
   EXPECT_EQ(emitter->Particles[0].Size, 1.0f);
   EXPECT_EQ(emitter->Particles[0].Color >> 24, 0u);
   EXPECT_EQ(emitter->SizeEnvelope, nullptr);
+}
+
+// A particle flung far (a coordinate beyond 1.8e18) sent Embree a ray it refuses with an
+// assertion, which aborted the host. Such segments are now searched without Embree, with the
+// answers the search gives closer in.
+TEST(CollisionFinding, FarSegmentsAgainstAMeshAreAnswered) {
+  Tev_DX8_ObjectDataChannel quad;
+  quad.BuildQuad(2.0f, 2.0f);  // y = 0, facing +y
+  Tev_MultiCollisionManager manager;
+  ASSERT_EQ(manager.AddMesh(&quad), 0);
+  manager.RebuildAllCollisionObjects();
+
+  const struct {
+    const char* Name;
+    D3DXVECTOR3 Origin;
+    D3DXVECTOR3 Ray;
+    int Id;
+  } cases[] = {
+      {"near, down through the quad", {0.0f, 1.0f, 0.0f}, {0.0f, -2.0f, 0.0f}, 0},
+      {"far above, down through it", {0.0f, 1e20f, 0.0f}, {0.0f, -2e20f, 0.0f}, 0},
+      {"far above, short of it", {0.0f, 1e20f, 0.0f}, {0.0f, -1e19f, 0.0f}, -1},
+      {"near, a huge ray down", {0.0f, 1.0f, 0.0f}, {0.0f, -3e38f, 0.0f}, 0},
+      {"far to the side", {3e38f, 1.0f, 0.0f}, {0.0f, -2.0f, 0.0f}, -1},
+  };
+  for (const auto& c : cases) {
+    D3DXVECTOR3 origin = c.Origin, ray = c.Ray, point, normal;
+    float cosine = 0.0f;
+    EXPECT_EQ(manager.GetClosestFrontFaceCollision(&origin, &ray, &point, &normal, &cosine), c.Id)
+        << c.Name;
+    if (c.Id == 0) {
+      EXPECT_NEAR(point.y, 0.0f, 1e-3f) << c.Name;
+      EXPECT_EQ(normal, D3DXVECTOR3(0.0f, 1.0f, 0.0f)) << c.Name;
+    }
+  }
 }
 
 }  // namespace
