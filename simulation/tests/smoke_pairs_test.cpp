@@ -32,7 +32,7 @@ using Smoke = Tev_AdvPE_SmokeSettings;
 using Key = Tev_EnvelopeStorage::Key;
 
 // Everything random about a scene, drawn from its seed before it runs.
-struct SceneSpec {
+struct SceneRecipe {
   unsigned Seed = 0;
   int Count = 0;
   float BirthsPerSecond = 0.0f;
@@ -90,9 +90,9 @@ class SceneRandom {
   std::mt19937 engine_;
 };
 
-SceneSpec DrawScene(unsigned seed) {
+SceneRecipe DrawScene(unsigned seed) {
   SceneRandom random(seed);
-  SceneSpec s;
+  SceneRecipe s;
   s.Seed = seed;
   s.Count = random.Between(24, 240);
   s.BirthsPerSecond = random.Uniform(200.0f, 4000.0f);
@@ -163,7 +163,7 @@ class SceneRun {
   SceneRun(const SceneRun&) = delete;
   SceneRun& operator=(const SceneRun&) = delete;
 
-  Outcome Run(const SceneSpec& s, sim::PairSearch search) {
+  Outcome Run(const SceneRecipe& s, sim::PairSearch search) {
     Link(s);
     sim::SmokePairGrid& grid = emitter_->Step.SmokePairs;
     grid.Search = search;
@@ -197,7 +197,7 @@ class SceneRun {
     return envelope;
   }
 
-  void Link(const SceneSpec& s) {
+  void Link(const SceneRecipe& s) {
     Tev_AdvancedParticleEmitter& e = *emitter_;
     Value(e, kLinkParticleCount, static_cast<float>(s.Count));
     Value(e, kLinkHardwareParticles, 1.0f);
@@ -266,7 +266,7 @@ class SceneRun {
 
   // Records the grid must treat exactly as the loop does, at the lowest indexes (births take
   // the lowest free record, so these are not overwritten unless old particles are replaced).
-  void PlaceOddities(const SceneSpec& s) {
+  void PlaceOddities(const SceneRecipe& s) {
     const float reach = s.Repulsion.empty() ? 1.0f : s.Repulsion.back().X;
     constexpr float kInf = std::numeric_limits<float>::infinity();
     const float nan = std::numeric_limits<float>::quiet_NaN();
@@ -299,9 +299,9 @@ class SceneRun {
   std::unique_ptr<Tev_AdvancedParticleEmitter> emitter_;
 };
 
-Outcome RunScene(const SceneSpec& spec, sim::PairSearch search) {
+Outcome RunScene(const SceneRecipe& recipe, sim::PairSearch search) {
   SceneRun run;
-  return run.Run(spec, search);
+  return run.Run(recipe, search);
 }
 
 bool SameBits(const D3DXVECTOR3& a, const D3DXVECTOR3& b) {
@@ -352,11 +352,11 @@ TEST_P(GridMatchesAllPairs, BitForBitInRandomScenes) {
   int gridScenes = 0;
   int pushed = 0;
   for (unsigned k = 0; k < kScenesPerBlock; ++k) {
-    const SceneSpec spec = DrawScene(GetParam() * kScenesPerBlock + k + 1);
-    const Outcome grid = RunScene(spec, sim::PairSearch::Automatic);
-    const Outcome loop = RunScene(spec, sim::PairSearch::AllPairs);
+    const SceneRecipe recipe = DrawScene(GetParam() * kScenesPerBlock + k + 1);
+    const Outcome grid = RunScene(recipe, sim::PairSearch::Automatic);
+    const Outcome loop = RunScene(recipe, sim::PairSearch::AllPairs);
     EXPECT_EQ(loop.GridSteps, 0);
-    EXPECT_EQ(FirstDifference(grid, loop), "") << "scene seed " << spec.Seed;
+    EXPECT_EQ(FirstDifference(grid, loop), "") << "scene seed " << recipe.Seed;
     if (grid.GridSteps > 0) ++gridScenes;
     pushed += CountPushed(grid);
   }
