@@ -8,6 +8,7 @@
 #include "plugin/advanced_particle_emitter.h"
 #include "plugin/link_reading.h"
 #include "plugin/link_table.h"
+#include "simulation/envelope_sampling.h"
 #include "simulation/particle_pool.h"
 
 namespace {
@@ -28,11 +29,7 @@ void KeepOrReadVector(const Tev_AdvancedParticleEmitter& e, int index, D3DXVECTO
 }
 
 void ReadMainEnvelopes(Tev_AdvancedParticleEmitter& e) {
-  e.SizeEnvelope = EnvelopeLink(e, kLinkSizeEnvelope);
-  e.AlphaEnvelope = EnvelopeLink(e, kLinkVertexAlphaEnvelope);
-  e.RedEnvelope = EnvelopeLink(e, kLinkRedColorEnvelope);
-  e.GreenEnvelope = EnvelopeLink(e, kLinkGreenColorEnvelope);
-  e.BlueEnvelope = EnvelopeLink(e, kLinkBlueColorEnvelope);
+  sim::HoldMainEnvelopes(e);
   for (Tev_EnvelopeStorage* envelope :
        {e.SizeEnvelope, e.AlphaEnvelope, e.RedEnvelope, e.GreenEnvelope, e.BlueEnvelope})
     if (envelope) envelope->Initialize();
