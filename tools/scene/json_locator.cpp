@@ -29,14 +29,15 @@ class Walker {
     if (text_[pos_] == '\n') ++line_;
     ++pos_;
   }
-  // Spaces and the comments the parser is told to accept: // to the end of the line, /* */.
+  // Spaces and the comments the parser is told to accept: /* */, and // up to a line end, which
+  // for the parser is a carriage return or a NUL as well as a newline.
   void SkipSpace() {
     for (;;) {
       while (!AtEnd() && (Peek() == ' ' || Peek() == '\t' || Peek() == '\n' || Peek() == '\r'))
         Advance();
       if (Peek() != '/' || pos_ + 1 >= text_.size()) return;
       if (text_[pos_ + 1] == '/') {
-        while (!AtEnd() && Peek() != '\n') Advance();
+        while (!AtEnd() && Peek() != '\n' && Peek() != '\r' && Peek() != '\0') Advance();
       } else if (text_[pos_ + 1] == '*') {
         Advance();
         Advance();
@@ -80,6 +81,7 @@ class Walker {
     SkipSpace();
     std::set<std::string> seen;
     while (!AtEnd() && Peek() != '}') {
+      const std::size_t start = pos_;
       const std::string key = String();
       if (!seen.insert(key).second && !*has_duplicate_) {
         *has_duplicate_ = true;
@@ -94,6 +96,7 @@ class Walker {
       SkipSpace();
       if (Peek() == ',') Advance();
       SkipSpace();
+      if (pos_ == start) break;  // a text read otherwise than the parser did: never loop in place
     }
     if (!AtEnd()) Advance();
   }
@@ -103,10 +106,12 @@ class Walker {
     SkipSpace();
     std::size_t index = 0;
     while (!AtEnd() && Peek() != ']') {
+      const std::size_t start = pos_;
       Value(path.Index(index++));
       SkipSpace();
       if (Peek() == ',') Advance();
       SkipSpace();
+      if (pos_ == start) break;  // a text read otherwise than the parser did: never loop in place
     }
     if (!AtEnd()) Advance();
   }
