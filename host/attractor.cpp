@@ -1,9 +1,9 @@
 #include "host/attractor.h"
 
 #include "host/collision_vector.h"
+#include "host/link_values.h"
 #include "host/sibling_links.h"
 #include "host/type_guids.h"
-#include "plugin/link_reading.h"
 
 namespace {
 

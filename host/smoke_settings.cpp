@@ -3,9 +3,9 @@
 #include <cmath>
 
 #include "host/envelope_storage.h"
+#include "host/link_values.h"
 #include "host/sibling_links.h"
 #include "host/type_guids.h"
-#include "plugin/link_reading.h"
 
 namespace {
 
