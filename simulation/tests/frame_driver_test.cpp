@@ -3,7 +3,9 @@
 #include <algorithm>
 #include <cmath>
 #include <limits>
+#include <memory>
 #include <optional>
+#include <vector>
 
 #include "simulation/tests/emitter_fixture.h"
 
@@ -158,15 +160,15 @@ TEST_F(FrameDriver, RebuildsOnlyWhenTheCountOrTheDrawingPathReadsDifferently) {
   }
 }
 
-// 0, negative or NaN, from the start or replacing a usable rate: no step, blend factor 0 and no
-// overload message.
+// 0, negative, NaN or infinite, from the start or replacing a usable rate: no step, blend factor
+// 0 and no overload message.
 TEST_F(FrameDriver, AnUnusableLogicRateRunsNoStep) {
   LinkBasics(2.0f, 0.0f, 0.0f);
   Start();
   PlaceParticle(0, kZero, {0.0f, 0.0f, 1.0f});
   RunFrames(2, 50.0);
   EXPECT_EQ(P(0).RenderPosition, kZero);
-  for (float rate : {0.0f, -5.0f, kNaN}) {
+  for (float rate : {0.0f, -5.0f, kNaN, std::numeric_limits<float>::infinity()}) {
     SetValue(kLinkLogicUpdatesPerSecond, 50.0f);
     emitter->LogicAccumulator = 0.0f;
     PlaceParticle(0, kZero, {0.0f, 0.0f, 1.0f});
@@ -176,6 +178,40 @@ TEST_F(FrameDriver, AnUnusableLogicRateRunsNoStep) {
     EXPECT_EQ(P(0).RenderPosition, D3DXVECTOR3(0.0f, 0.0f, 2.0f)) << rate;
   }
   EXPECT_TRUE(overloadMessages.empty());
+}
+
+// A clock that runs backwards banks negative time; the drawing stays at the last step.
+TEST_F(FrameDriver, ABackwardClockBlendsNoFurtherBack) {
+  LinkBasics(2.0f, 50.0f, 0.0f);
+  Start();
+  PlaceParticle(0, kZero, {0.0f, 0.0f, 1.0f});
+  clock.Advance(-TestClock::kTicksPerSecond / 100);
+  context.AdvanceFrame();
+  emitter->CallChannel();
+  EXPECT_LT(emitter->LogicAccumulator, 0.0f);
+  EXPECT_EQ(P(0).RenderPosition, kZero);
+}
+
+// Once the host context is gone a frame call does nothing, and the public operations stay safe.
+TEST(FrameDriverWithoutHost, DoesNothingOnceTheHostContextIsGone) {
+  auto context = std::make_unique<Qen_HostContext>();
+  std::optional<Qen_HostContext::ScopedCurrent> current(context.get());
+  Tev_AdvancedParticleEmitter emitter;
+  Qen_ValueChannel count(4.0f);
+  ASSERT_TRUE(emitter.SetChild(kLinkParticleCount, &count));
+  emitter.CallChannel();
+  ASSERT_TRUE(emitter.Initialized);
+  current.reset();
+  context.reset();
+  ASSERT_EQ(emitter.GetHostContext(), nullptr);
+  const std::uint32_t lastFrame = emitter.LastFrameCounter;
+  emitter.CallChannel();
+  emitter.CallChannel();
+  EXPECT_EQ(emitter.LastFrameCounter, lastFrame);
+  EXPECT_FALSE(emitter.GetIfParticleActive(0));
+  EXPECT_EQ(emitter.GetParticlePosition(0), D3DXVECTOR3(0.0f, 0.0f, 0.0f));
+  emitter.BirthParticle(0);
+  emitter.ClearChild(kLinkParticleCount);
 }
 
 TEST(RandInt, DrawsOnlyForARangeOfTwoOrMore) {
