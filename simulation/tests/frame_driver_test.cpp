@@ -7,6 +7,7 @@
 #include <optional>
 #include <vector>
 
+#include "host/type_guids.h"
 #include "simulation/tests/emitter_fixture.h"
 
 namespace {
@@ -190,6 +191,91 @@ TEST_F(FrameDriver, ABackwardClockBlendsNoFurtherBack) {
   emitter->CallChannel();
   EXPECT_LT(emitter->LogicAccumulator, 0.0f);
   EXPECT_EQ(P(0).RenderPosition, kZero);
+}
+
+// Link channels that record, in order, the emitter links they stand at as they are read or
+// written.
+using ReadLog = std::vector<int>;
+class RecordingValue : public Qen_ValueChannel {
+ public:
+  RecordingValue(int link, ReadLog* log) : link_(link), log_(log) {}
+  float GetValue() override { return log_->push_back(link_), Qen_ValueChannel::GetValue(); }
+  void SetValue(float value) override { log_->push_back(link_), Qen_ValueChannel::SetValue(value); }
+
+ private:
+  int link_;
+  ReadLog* log_;
+};
+class RecordingVector : public Qen_ValueVectorChannel {
+ public:
+  RecordingVector(int link, ReadLog* log) : link_(link), log_(log) {}
+  D3DXVECTOR3 GetVector() override {
+    return log_->push_back(link_), Qen_ValueVectorChannel::GetVector();
+  }
+
+ private:
+  int link_;
+  ReadLog* log_;
+};
+class RecordingMatrix : public Qen_MatrixChannel {
+ public:
+  RecordingMatrix(int link, ReadLog* log) : link_(link), log_(log) {}
+  D3DXMATRIX GetMatrix() override { return log_->push_back(link_), Qen_MatrixChannel::GetMatrix(); }
+
+ private:
+  int link_;
+  ReadLog* log_;
+};
+
+TEST_F(FrameDriver, ReadsEveryLinkAtItsPlaceInTheStageOrder) {
+  ReadLog log;
+  LinkSmoke();
+  Start();
+  for (int link = 1; link <= kLinkSimulationScaler; ++link) {
+    const GUID type = GetEmitterLinkSpec(link).TypeGuid;
+    if (type == kValueGuid) {
+      emitter->ClearChild(link);
+      Link(*emitter, link, Make<RecordingValue>(link, &log));
+    } else if (type == kValueVectorGuid) {
+      Link(*emitter, link, Make<RecordingVector>(link, &log));
+    } else if (type == kMatrixGuid) {
+      Link(*emitter, link, Make<RecordingMatrix>(link, &log));
+    }
+  }
+  emitter->ReadLinks();
+  const std::vector<int> documented = {kLinkAttachedSizeOffsetAdditive,
+                                       kLinkParticleCount,
+                                       kLinkHardwareParticles,
+                                       kLinkBouncingReportCollisions,
+                                       kLinkSlidingAttractorImmunity,
+                                       kLinkAlignToNormals,
+                                       kLinkSizeOffsetMax,
+                                       kLinkSmoke,
+                                       kLinkUseVertexAlphaFading,
+                                       kLinkAttachedSlideRate,
+                                       kLinkAttachedLifespan,
+                                       kLinkAttachedSlidingHeight,
+                                       kLinkSimulationScaler,
+                                       kLinkSpinSpeedMin,
+                                       kLinkSpinSpeedMax,
+                                       kLinkSpinStart,
+                                       kLinkEmitterMotion,
+                                       kLinkCollisionReportRate,
+                                       kLinkOutCollisionId,
+                                       kLinkAttachRate,
+                                       kLinkBounceRate,
+                                       kLinkMaximumSpeed,
+                                       kLinkInitialForceStrength,
+                                       kLinkInitialForceAlongNormal,
+                                       kLinkVertexEmissions,
+                                       kLinkLookAt,
+                                       kLinkLookAtLocal,
+                                       kLinkReplaceOldParticles,
+                                       kLinkLifespanMin,
+                                       kLinkLifespanMax,
+                                       kLinkInitialForceOverride,
+                                       kLinkGlobalForce};
+  EXPECT_EQ(log, documented);
 }
 
 // Once the host context is gone a frame call does nothing, and the public operations stay safe.
