@@ -101,6 +101,9 @@ void Tev_AdvancedParticleEmitter::UpdateLiveParticle(int index) {
     return;
   }
   p.NormalizedAge = p.Age / p.Lifespan;
+  // Only the smoke stage sets and clears the smoke force: with smoke off it must not keep
+  // pushing with what it gathered last.
+  if (!SmokeEnabled) p.SmokeForce = sim::kZeroVector;
   IntegrateVelocity(*this, p, FadeWithAge(*this, p));
   ApplySizeEnvelope(p);
   // The collision may kill, attach or redirect the particle; the stages below run on regardless.
