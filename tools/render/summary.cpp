@@ -23,7 +23,9 @@ std::string RenderSummary(const SummaryFacts& facts, const StatsTable::Totals& t
   if (facts.Messages > 0)
     summary += " The emitters sent " + std::to_string(facts.Messages) + " debug message" +
                (facts.Messages == 1 ? "" : "s") + ".";
-  if (facts.FramesWritten > 0)
+  if (facts.FramesWritten > 0 && !facts.OnlyFrameFile.empty())
+    summary += " Written to " + facts.Folder + ": " + facts.OnlyFrameFile + " and stats.csv.";
+  else if (facts.FramesWritten > 0)
     summary += " Written to " + facts.Folder + ": " + std::to_string(facts.FramesWritten) +
                " frames, contact_sheet.png, preview.gif and stats.csv.";
   else

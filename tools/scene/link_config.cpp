@@ -104,7 +104,10 @@ void SceneBuilder::Link(Qen_Channel* owner, int index, Qen_Channel* child, bool 
     if (!many) owner->SetChild(index, nullptr);
     return;
   }
-  if (many ? owner->AddChild(index, child) : owner->SetChild(index, child)) return;
+  if (many ? owner->AddChild(index, child) : owner->SetChild(index, child)) {
+    scene_->LinkSources.push_back({owner, index, child, path});
+    return;
+  }
   const ChildCreation& link = *owner->GetChildCreation(index);
   std::string what = "a channel (" + TypeNameOf(child) + ")";
   for (const Scene::NamedChannel& named : scene_->Named)
@@ -128,6 +131,8 @@ Qen_Channel* SceneBuilder::ResolveLinkValue(const Json& value, const DocPath& pa
   if (type == kValueGuid && !value.is_string() && !inline_definition) {
     const Track<float> track = ReadTrack(value, path, kNumber);
     auto* channel = static_cast<Qen_ValueChannel*>(CreateByGuid(type, type_name, path));
+    Remember(channel, "", path);
+    RememberRange(channel, track);
     channel->SetValue(track.Sample(0.0));
     if (track.IsAnimated())
       scene_->Animators.push_back(
@@ -137,6 +142,7 @@ Qen_Channel* SceneBuilder::ResolveLinkValue(const Json& value, const DocPath& pa
   if (type == kValueVectorGuid && !value.is_string() && !inline_definition) {
     const Track<D3DXVECTOR3> track = ReadTrack(value, path, kVector);
     auto* channel = static_cast<Qen_ValueVectorChannel*>(CreateByGuid(type, type_name, path));
+    Remember(channel, "", path);
     channel->SetVector(track.Sample(0.0));
     if (track.IsAnimated())
       scene_->Animators.push_back(
@@ -146,6 +152,7 @@ Qen_Channel* SceneBuilder::ResolveLinkValue(const Json& value, const DocPath& pa
   if (type == kMatrixGuid && !value.is_string() && !inline_definition) {
     const Track<MatrixValue> track = ReadTrack(value, path, kMatrix);
     auto* channel = static_cast<Qen_MatrixChannel*>(CreateByGuid(type, type_name, path));
+    Remember(channel, "", path);
     channel->SetMatrix(track.Sample(0.0).Matrix);
     if (track.IsAnimated())
       scene_->Animators.push_back(
@@ -154,6 +161,7 @@ Qen_Channel* SceneBuilder::ResolveLinkValue(const Json& value, const DocPath& pa
   }
   if (type == kEnvelopeStorageGuid && value.is_array()) {
     Qen_Channel* channel = CreateByGuid(type, type_name, path);
+    Remember(channel, "", path);
     SetEnvelopeKeys(channel, value, path, "linear");
     return channel;
   }
@@ -187,6 +195,7 @@ Qen_Channel* SceneBuilder::ResolveChannel(const Json& value, const DocPath& path
   } else {
     channel = CreateByGuid(type, type_name, path);
   }
+  Remember(channel, "", path);
   Configure(channel, value, path);
   return channel;
 }

@@ -31,6 +31,10 @@ class SceneBuilder {
   Qen_Channel* CreateByName(const std::string& type_name, const DocPath& type_path);
   Qen_Channel* CreateByGuid(const GUID& type, const std::string& type_name, const DocPath& path);
   std::string ResolveFile(const std::string& relative) const;
+  // Notes where a channel was written (a named one with its name), for later messages.
+  void Remember(const Qen_Channel* channel, const std::string& name, const DocPath& path);
+  // Notes a Value channel's range over the shot.
+  void RememberRange(const Qen_Channel* channel, const Track<float>& track);
 
   // channel_config.cpp: fills a channel from its definition object.
   void Configure(Qen_Channel* channel, const Json& definition, const DocPath& path);
@@ -56,6 +60,10 @@ class SceneBuilder {
                               const std::string& type_name);
   Qen_Channel* NamedChannel(const std::string& name, const DocPath& path,
                             const std::string& expected);
+  // A number or vector link written per second ({"per_second": ...} or
+  // {"per_second_squared": ...}), converted to per logic step with the emitter's logic rate.
+  Qen_Channel* ResolvePerSecond(Qen_Channel* owner, int index, const Json& value,
+                                const DocPath& path);
   void Link(Qen_Channel* owner, int index, Qen_Channel* child, bool many, const DocPath& path);
 
   Scene* scene_;

@@ -1,5 +1,6 @@
 #include "tools/scene/scene_loader.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <filesystem>
@@ -10,6 +11,7 @@
 #include "host/plugin_loader.h"
 #include "tools/scene/json_locator.h"
 #include "tools/scene/scene_builder.h"
+#include "tools/scene/scene_check.h"
 #include "tools/scene/scene_error.h"
 
 namespace apescene {
@@ -168,6 +170,7 @@ void SceneBuilder::ReadChannels(const Json& channels, const DocPath& path) {
     const std::string type = ReadString(Require(item.value(), at, "type"), at.Key("type"));
     Qen_Channel* channel = CreateByName(type, at.Key("type"));
     channel->SetChannelName(item.key().c_str());
+    Remember(channel, item.key(), at);
     scene_->Named.push_back({item.key(), channel});
     made.emplace_back(channel, &item.value());
   }
@@ -205,6 +208,24 @@ Qen_Channel* SceneBuilder::CreateByGuid(const GUID& type, const std::string& typ
   return channel;
 }
 
+void SceneBuilder::Remember(const Qen_Channel* channel, const std::string& name,
+                            const DocPath& path) {
+  scene_->ChannelSources.push_back({channel, name, path});
+}
+
+void SceneBuilder::RememberRange(const Qen_Channel* channel, const Track<float>& track) {
+  if (!track.IsAnimated()) return;
+  for (Scene::ChannelSource& source : scene_->ChannelSources) {
+    if (source.Channel != channel) continue;
+    source.Animated = true;
+    source.Least = source.Greatest = track.Keys.front().Value;
+    for (const auto& key : track.Keys) {
+      source.Least = std::min(source.Least, key.Value);
+      source.Greatest = std::max(source.Greatest, key.Value);
+    }
+  }
+}
+
 std::string SceneBuilder::ResolveFile(const std::string& relative) const {
   const std::filesystem::path file(relative);
   if (file.is_absolute() || base_directory_.empty()) return file.string();
@@ -239,7 +260,7 @@ bool Run(const SceneSource& source, std::string* error, Build build) {
   try {
     if (locator.HasDuplicateKey())
       throw SceneError(locator.DuplicateKey(), "this key is given twice in the same object");
-    build(root);
+    build(root, locator);
   } catch (const SceneError& e) {
     const std::string where = WithLine(source.DisplayName, locator.LineOf(e.Path()));
     *error = OneLine(where + ": " + (e.Path().IsRoot() ? "" : e.Path().Text() + ": ") + e.what());
@@ -257,15 +278,21 @@ std::unique_ptr<Scene> LoadScene(const SceneSource& source, PluginLoader& loader
                                  std::string* error) {
   auto scene = std::make_unique<Scene>();
   scene->SourceName = source.DisplayName;
-  const bool ok = Run(source, error, [&](const Json& root) {
+  const bool ok = Run(source, error, [&](const Json& root, const JsonLocator& locator) {
     SceneBuilder(scene.get(), &loader, source.BaseDirectory).Build(root);
+    for (Scene::ChannelSource& place : scene->ChannelSources)
+      place.Line = locator.LineOf(place.Path);
+    for (Scene::LinkSource& place : scene->LinkSources) place.Line = locator.LineOf(place.Path);
+    for (SceneWarning& warning : scene->LoadWarnings) warning.Line = locator.LineOf(warning.Path);
   });
-  return ok ? std::move(scene) : nullptr;
+  if (!ok) return nullptr;
+  scene->Warnings = CheckScene(*scene);
+  return scene;
 }
 
 bool ReadSceneSettings(const SceneSource& source, RenderSettings* settings, std::string* error) {
   Scene scene;
-  const bool ok = Run(source, error, [&](const Json& root) {
+  const bool ok = Run(source, error, [&](const Json& root, const JsonLocator&) {
     SceneBuilder(&scene, nullptr, source.BaseDirectory).BuildSettings(root);
   });
   if (ok) *settings = scene.Settings;
