@@ -58,8 +58,10 @@ class SceneBuilder {
   // A named channel of the given type, or an inline definition of one.
   Qen_Channel* ResolveChannel(const Json& value, const DocPath& path, const GUID& type,
                               const std::string& type_name);
+  // `expected` names the value kind a string stood in for ("a number"), empty for a channel
+  // link; `link_type` is the type the link takes, for hints.
   Qen_Channel* NamedChannel(const std::string& name, const DocPath& path,
-                            const std::string& expected);
+                            const std::string& expected, const std::string& link_type = "");
   // A number or vector link written per second ({"per_second": ...} or
   // {"per_second_squared": ...}), converted to per logic step with the emitter's logic rate.
   Qen_Channel* ResolvePerSecond(Qen_Channel* owner, int index, const Json& value,

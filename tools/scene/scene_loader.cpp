@@ -10,6 +10,7 @@
 #include "host/link_channels.h"
 #include "host/plugin_loader.h"
 #include "tools/scene/json_locator.h"
+#include "tools/scene/name_suggestions.h"
 #include "tools/scene/scene_builder.h"
 #include "tools/scene/scene_check.h"
 #include "tools/scene/scene_error.h"
@@ -190,7 +191,11 @@ Qen_Channel* SceneBuilder::CreateByName(const std::string& type_name, const DocP
     if (!error.empty()) throw SceneError(type_path, error);
     std::string known;
     for (const std::string& name : types_.TypeNames) known += (known.empty() ? "" : ", ") + name;
-    std::string message = "unknown channel type \"" + type_name + "\" (known: " + known + ")";
+    std::string message = "unknown channel type \"" + type_name + "\"";
+    if (const std::string suggestion = SuggestName(type_name, types_.TypeNames);
+        !suggestion.empty())
+      message += "; did you mean \"" + suggestion + "\"?";
+    message += " (known: " + known + ")";
     for (const std::string& problem : types_.Problems) message += "; " + problem;
     throw SceneError(type_path, message);
   }
