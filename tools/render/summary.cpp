@@ -12,12 +12,13 @@ std::string RenderSummary(const SummaryFacts& facts, const StatsTable::Totals& t
       text, sizeof text,
       "Rendered %d frames of %s (%.2f s of scene time at %g fps, seed %u) at %dx%d on %s in "
       "%.1f s, %.1f frames per second. The emitters peaked at %d live particles (%d attached, "
-      "%d sliding), with %lld births in %lld logic steps; the channels took %.2f ms a frame on "
+      "%d sliding), with %lld births and %lld deaths in %lld logic steps; the channels took %.2f "
+      "ms a frame on "
       "average (%.2f ms at most), %.2f ms of it in draw calls, and finishing and reading back "
       "each picture %.2f ms.",
       totals.Frames, facts.SceneName.c_str(), shown, facts.Fps, facts.Seed, facts.Width,
       facts.Height, facts.Device.c_str(), facts.WallSeconds, rate, totals.PeakLive,
-      totals.PeakAttached, totals.PeakSliding, totals.Births, totals.LogicSteps,
+      totals.PeakAttached, totals.PeakSliding, totals.Births, totals.Deaths, totals.LogicSteps,
       totals.MeanChannelMs, totals.MaxChannelMs, totals.MeanDrawMs, totals.MeanReadbackMs);
   std::string summary = text;
   if (facts.Messages > 0)
