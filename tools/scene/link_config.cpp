@@ -75,6 +75,9 @@ void SceneBuilder::ConfigureLinks(Qen_Channel* channel, const Json& links, const
         Link(channel, index,
              ResolveLinkValue(item.value()[i], at.Index(i), link.Type.TypeGuid, TypeName(link)),
              true, at.Index(i));
+    } else if (Qen_Channel* converted =
+                   ResolvePerSecond(channel, index, item.value(), at, links, path)) {
+      Link(channel, index, converted, false, at);
     } else {
       Link(channel, index, ResolveLinkValue(item.value(), at, link.Type.TypeGuid, TypeName(link)),
            false, at);

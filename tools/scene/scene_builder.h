@@ -64,8 +64,10 @@ class SceneBuilder {
                             const std::string& expected, const std::string& link_type = "");
   // A number or vector link written per second ({"per_second": ...} or
   // {"per_second_squared": ...}), converted to per logic step with the emitter's logic rate.
+  // Null when `value` is not written per second. `links` is the owner's whole links object,
+  // where the logic rate is found.
   Qen_Channel* ResolvePerSecond(Qen_Channel* owner, int index, const Json& value,
-                                const DocPath& path);
+                                const DocPath& path, const Json& links, const DocPath& links_path);
   void Link(Qen_Channel* owner, int index, Qen_Channel* child, bool many, const DocPath& path);
 
   Scene* scene_;
