@@ -15,6 +15,7 @@
 #include "tools/render/progress.h"
 #include "tools/render/render_output.h"
 #include "tools/render/stats_table.h"
+#include "tools/render/tile_label.h"
 #include "tools/scene/png_io.h"
 
 namespace scenetest {
@@ -106,6 +107,22 @@ TEST(RenderOutputTest, PicturesMakeFramesSheetAndPreviewAndStaleFramesGo) {
   ASSERT_EQ(DGifSlurp(gif), GIF_OK);
   EXPECT_EQ(gif->ImageCount, 2);
   DGifCloseFile(gif, &code);
+}
+
+TEST(TileLabelTest, CaptionInWhiteOnADarkBoxClippedToThePicture) {
+  EXPECT_EQ(aperender::TileCaption(12, 0.4), "frame 12  0.40 s");
+  Image picture = Filled(100, 40, 0xFF808080u);
+  aperender::DrawCaption(&picture, "1", 2);
+  auto at = [&](int x, int y) { return picture.Argb[static_cast<std::size_t>(y * 100 + x)]; };
+  // The margin is 2 font pixels (4 here); "1" has ink in its middle column on every row.
+  EXPECT_EQ(at(0, 0), 0xFF000000u);
+  EXPECT_EQ(at(4 + 2 * 2, 4), 0xFFFFFFFFu);
+  EXPECT_EQ(at(4, 4), 0xFF000000u);                  // no ink at the top-left of "1"
+  EXPECT_EQ(at(4 + 2 * 2, 4 + 6 * 2), 0xFFFFFFFFu);  // its foot
+  EXPECT_EQ(at(30, 30), 0xFF808080u);                // beyond the box
+  Image tiny = Filled(3, 2, 0xFF808080u);
+  aperender::DrawCaption(&tiny, "frame 1", 2);  // clipped, not written out of bounds
+  EXPECT_EQ(tiny.Argb.size(), 6u);
 }
 
 TEST(ParticleCensusTest, BankLoopGoesRoundAsTheFrameDriverDoes) {

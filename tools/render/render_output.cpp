@@ -6,6 +6,7 @@
 #include <regex>
 
 #include "tools/render/contact_sheet.h"
+#include "tools/render/tile_label.h"
 #include "tools/scene/png_io.h"
 
 namespace aperender {
@@ -63,7 +64,11 @@ bool RenderOutput::AddFrame(const FrameResult& frame, std::string* error) {
   const bool in_preview = (frame.Frame - 1) % preview_step_ == 0;
   if (!in_sheet && !in_preview) return true;
   const apescene::Image small = apescene::ShrinkToWidth(frame.Picture, kPreviewWidth);
-  if (in_sheet) sheet_pictures_.push_back(small);
+  if (in_sheet) {
+    apescene::Image tile = small;
+    DrawCaption(&tile, TileCaption(frame.Frame, frame.Seconds), kCaptionScale);
+    sheet_pictures_.push_back(std::move(tile));
+  }
   if (in_preview) {
     if (!gif_open_) {
       const int delay_cs = static_cast<int>(std::lround(100.0 * preview_step_ / fps_));

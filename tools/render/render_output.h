@@ -1,6 +1,7 @@
 // The files of a render in its output folder:
 //   frame_0001.png ...   every frame (only when the device draws pixels)
 //   contact_sheet.png    up to 12 evenly spaced frames in a grid, each at most 320 pixels wide
+//                        and captioned with its frame number and time
 //   preview.gif          the frames at most 320 pixels wide, at most about 25 frames a second
 //   stats.csv            one row per frame (stats_table.h)
 // Frames are written as they come; the sheet, the GIF (kept as preview.gif.partial until then)
@@ -22,6 +23,7 @@ class RenderOutput {
   static constexpr int kSheetColumns = 4;
   static constexpr int kPreviewWidth = 320;
   static constexpr double kPreviewFps = 25.0;
+  static constexpr int kCaptionScale = 2;  // screen pixels per font pixel
 
   // Creates the folder and removes the files an earlier render left in it. With `only_frame`
   // above 0 that frame is the one picture written (no sheet, no preview).
