@@ -78,6 +78,8 @@ TEST(PerSecondTest, RefusedWhereItCannotBeConverted) {
       {R"({"Logic Updates Per Second": 0, "InitialForce_Strength": {"per_second": 1}})", "above 0"},
       {R"({"Logic Updates Per Second": 60, "Lifespan_Min": {"per_second": 1}})",
        "only the emitter's per-logic-step"},
+      {R"({"Logic Updates Per Second": 1e-30, "GlobalForce": {"per_second_squared": [0, 1e30, 0]}})",
+       "beyond the range of a float"},
   };
   TestHost host;
   for (const Case& c : cases) {

@@ -16,6 +16,7 @@ namespace {
 constexpr const char* kPerSecond = "per_second";
 constexpr const char* kPerSecondSquared = "per_second_squared";
 constexpr char kRateLink[] = "Logic Updates Per Second";
+constexpr const char* kOutOfRange = "per logic step this value is beyond the range of a float";
 
 bool IsPerSecondForm(const Json& value) {
   return value.is_object() && (value.contains(kPerSecond) || value.contains(kPerSecondSquared));
@@ -81,7 +82,10 @@ Qen_Channel* SceneBuilder::ResolvePerSecond(Qen_Channel* owner, int index, const
   if (type == kValueGuid) {
     Track<float> track =
         ReadTrack(value[key], at, std::function<float(const Json&, const DocPath&)>(ReadNumber));
-    for (auto& k : track.Keys) k.Value *= scale;
+    for (auto& k : track.Keys) {
+      k.Value *= scale;
+      if (!std::isfinite(k.Value)) throw SceneError(at, kOutOfRange);
+    }
     auto* channel = static_cast<Qen_ValueChannel*>(CreateByGuid(type, type_name, path));
     Remember(channel, "", path);
     RememberRange(channel, track);
@@ -93,7 +97,11 @@ Qen_Channel* SceneBuilder::ResolvePerSecond(Qen_Channel* owner, int index, const
   }
   Track<D3DXVECTOR3> track = ReadTrack(
       value[key], at, std::function<D3DXVECTOR3(const Json&, const DocPath&)>(ReadVector3));
-  for (auto& k : track.Keys) k.Value *= scale;
+  for (auto& k : track.Keys) {
+    k.Value *= scale;
+    if (!std::isfinite(k.Value.x) || !std::isfinite(k.Value.y) || !std::isfinite(k.Value.z))
+      throw SceneError(at, kOutOfRange);
+  }
   auto* channel = static_cast<Qen_ValueVectorChannel*>(CreateByGuid(type, type_name, path));
   Remember(channel, "", path);
   channel->SetVector(track.Sample(0.0));
