@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <unordered_set>
 
 #include "host/envelope_storage.h"
 #include "host/link_channels.h"
@@ -78,14 +79,13 @@ namespace {
 // a misspelt name. (Meshes may be drawn or collided with, and emitters run by themselves.)
 void CheckUnlinked(CheckContext& context) {
   const Scene& scene = context.TheScene();
+  std::unordered_set<const Qen_Channel*> linked;
+  for (const Scene::LinkSource& link : scene.LinkSources) linked.insert(link.Child);
   for (const Scene::ChannelSource& source : scene.ChannelSources) {
     if (source.Name.empty()) continue;
     const Qen_Channel* channel = source.Channel;
     if (IsType(channel, kObjectDataGuid) || IsType(channel, kAdvancedParticleEmitterGuid)) continue;
-    const bool linked =
-        std::any_of(scene.LinkSources.begin(), scene.LinkSources.end(),
-                    [&](const Scene::LinkSource& link) { return link.Child == channel; });
-    if (!linked)
+    if (linked.count(channel) == 0)
       context.AtChannel(channel, "\"" + source.Name +
                                      "\" is linked nowhere, so it changes nothing (a link may "
                                      "name it: \"link name\": \"" +
