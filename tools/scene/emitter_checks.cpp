@@ -81,6 +81,14 @@ class EmitterCheck {
                " frames a second is more than the 1001 births the emitter gives a frame: the "
                "rest are dropped");
     }
+    if (Number(kLinkSimulationScaler, &range)) {
+      if (!(range.Greatest > 0.0f))
+        At(kLinkSimulationScaler, "never above 0: the emitter is paused for the whole shot");
+      else if (range.Greatest > 3.0f)
+        At(kLinkSimulationScaler, ShowNumber(range.Greatest) +
+                                      " is above 3, which runs at 1 (the scaler's range is "
+                                      "above 0 to 3)");
+    }
     if (Number(kLinkLogicUpdatesPerSecond, &range) && !(range.Least > 0.0f))
       At(kLinkLogicUpdatesPerSecond,
          ShowNumber(range.Least) +

@@ -289,10 +289,9 @@ std::unique_ptr<Scene> LoadScene(const SceneSource& source, PluginLoader& loader
       place.Line = locator.LineOf(place.Path);
     for (Scene::LinkSource& place : scene->LinkSources) place.Line = locator.LineOf(place.Path);
     for (SceneWarning& warning : scene->LoadWarnings) warning.Line = locator.LineOf(warning.Path);
+    scene->Warnings = CheckScene(*scene);
   });
-  if (!ok) return nullptr;
-  scene->Warnings = CheckScene(*scene);
-  return scene;
+  return ok ? std::move(scene) : nullptr;
 }
 
 bool ReadSceneSettings(const SceneSource& source, RenderSettings* settings, std::string* error) {
