@@ -68,8 +68,9 @@ a second, a speed of 3 units/s is 3 / 60 = 0.05 per step and a gravity of 9.8 un
 9.8 / 60^2 = 0.00272 per step per step. An emitter link of such a unit may be written per
 second in a scene and is converted with the emitter's own "Logic Updates Per Second" (a plain
 number): {"per_second": 3} for a speed or spin, {"per_second_squared": [0, -9.8, 0]} for a
-force. Attractor and smoke settings take per-step values only (they serve any emitter): divide
-by the rate of the emitter that uses them.)";
+force ("Simulation Scaler" multiplies them further, as it does every per-step value). Attractor
+and smoke settings take per-step values only (they serve any emitter): divide by the rate of the
+emitter that uses them.)";
 }
 
 std::string LinkReferenceMarkdown() {
