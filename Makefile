@@ -8,7 +8,7 @@ CMAKE_GEN = -G Ninja
 # LeakSanitizer's exit check; the tests compile few shaders, so they run without it.
 export MESA_SHADER_CACHE_DISABLE = true
 
-.PHONY: deps test test-sanitize demo update-golden bench format build fuzz soak
+.PHONY: deps test test-sanitize demo studio update-golden bench format build fuzz soak
 
 deps:
 	@scripts/install-deps
@@ -29,6 +29,10 @@ test-sanitize: deps
 # Renders the built-in fountain into out/demo/: frames, contact sheet, GIF preview, stats.
 demo: build
 	APE_PLUGIN_DIR=$(BUILD_DIR)/plugins $(BUILD_DIR)/bin/ape-render --out out/demo
+
+# The live editor in the browser on SCENE (default: the built-in fountain); prints the address.
+studio: build
+	APE_PLUGIN_DIR=$(BUILD_DIR)/plugins $(BUILD_DIR)/bin/ape-studio $(SCENE)
 
 # Renders the example scenes afresh into tests/golden/, after a deliberate change of a picture.
 update-golden: build

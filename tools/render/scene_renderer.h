@@ -19,12 +19,13 @@ class Tev_AdvancedParticleEmitter;
 namespace aperender {
 
 struct FrameResult {
-  int Frame = 0;             // from 1
-  double Seconds = 0.0;      // scene time shown
-  ParticleCounts Particles;  // all emitters together
-  double ChannelMs = 0.0;    // inside CallChannel of every channel
-  double DrawMs = 0.0;       // of which in device draw calls
-  double ReadbackMs = 0.0;   // EndScene and reading the pixels back
+  int Frame = 0;                      // from 1
+  double Seconds = 0.0;               // scene time shown
+  ParticleCounts Particles;           // all emitters together
+  double ChannelMs = 0.0;             // inside CallChannel of every channel
+  std::vector<double> ChannelMsEach;  // the same per channel, in the scene's channel order
+  double DrawMs = 0.0;                // of which in device draw calls
+  double ReadbackMs = 0.0;            // EndScene and reading the pixels back
   bool HasPicture = false;
   apescene::Image Picture;
 };
