@@ -28,7 +28,8 @@ async function api(path, body) {
   }
   const response = await fetch(path, options);
   const answer = await response.json();
-  if (answer.state) applyState(answer.state);
+  if (path === '/api/state') applyState(answer);
+  else if (answer.state) applyState(answer.state);
   return answer;
 }
 
