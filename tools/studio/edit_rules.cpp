@@ -23,7 +23,7 @@ constexpr LinkRange kLinkRanges[] = {
 
 std::string Number(double value) {
   char text[32];
-  std::snprintf(text, sizeof text, "%g", value);
+  std::snprintf(text, sizeof text, "%.10g", value);
   return text;
 }
 
@@ -34,11 +34,11 @@ std::string CheckNumbers(const Json& value, int depth) {
     const double number = value.get<double>();
     if (!std::isfinite(number)) return "numbers must be finite";
     if (std::fabs(number) > kMaximumMagnitude)
-      return Number(number) + " is out of range (the studio takes -1e+06 to 1e+06)";
+      return Number(number) + " is out of range (the studio takes -1000000 to 1000000)";
   } else if (value.is_number()) {
     const double number = value.get<double>();
     if (std::fabs(number) > kMaximumMagnitude)
-      return Number(number) + " is out of range (the studio takes -1e+06 to 1e+06)";
+      return Number(number) + " is out of range (the studio takes -1000000 to 1000000)";
   }
   if (value.is_structured())
     for (const Json& item : value) {
@@ -59,17 +59,16 @@ const std::string* LinkNameOf(const Json& path) {
 }  // namespace
 
 std::string CheckEditValue(const Json& path, const Json& value) {
-  std::string problem = CheckNumbers(value, 0);
-  if (!problem.empty()) return problem;
+  // A link's own range first: it says more than the studio's general one.
   const std::string* link = LinkNameOf(path);
-  if (link == nullptr || !value.is_number()) return "";
-  for (const LinkRange& range : kLinkRanges) {
+  if (link != nullptr && value.is_number() && std::isfinite(value.get<double>())) {
     const double number = value.get<double>();
-    if (*link == range.Name && !(number >= range.Minimum && number <= range.Maximum))
-      return "\"" + *link + "\" takes " + Number(range.Minimum) + " to " + Number(range.Maximum) +
-             ", got " + Number(number);
+    for (const LinkRange& range : kLinkRanges)
+      if (*link == range.Name && !(number >= range.Minimum && number <= range.Maximum))
+        return "\"" + *link + "\" takes " + Number(range.Minimum) + " to " + Number(range.Maximum) +
+               ", got " + Number(number);
   }
-  return "";
+  return CheckNumbers(value, 0);
 }
 
 std::string CheckStudioLimits(const Json& root) {

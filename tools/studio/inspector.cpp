@@ -65,6 +65,7 @@ Json DescribeLinks(const apescene::Scene& scene, const std::string& name, Qen_Ch
     }
     Json choices = Json::array();
     for (const apescene::Scene::NamedChannel& named : scene.Named) {
+      if (named.Channel == channel) continue;  // a channel is no link of its own
       const ChannelType type = named.Channel->GetChannelType();
       if (type.TypeGuid == link->Type.TypeGuid || type.BaseTypeGuid == link->Type.TypeGuid)
         choices.push_back(named.Name);

@@ -6,10 +6,14 @@ namespace {
 constexpr std::size_t kMaximumPathLength = 16;
 constexpr std::size_t kMaximumKeyLength = 200;
 
+bool IsIndex(const Json& step) {
+  return step.is_number_unsigned() || (step.is_number_integer() && step.get<long long>() >= 0);
+}
+
 // Whether a path step is usable: a key of reasonable length or an index.
 bool ValidStep(const Json& step) {
   if (step.is_string()) return step.get_ref<const std::string&>().size() <= kMaximumKeyLength;
-  return step.is_number_unsigned();
+  return IsIndex(step);
 }
 
 }  // namespace
@@ -35,8 +39,7 @@ bool SceneDocument::WithEdit(const Json& path, const Json& value, Json* result,
     if (step.is_string() && place->is_object()) {
       place = &(*place)[step.get<std::string>()];  // adds a missing member as null
       if (place->is_null()) *place = Json::object();
-    } else if (step.is_number_unsigned() && place->is_array() &&
-               step.get<std::size_t>() < place->size()) {
+    } else if (IsIndex(step) && place->is_array() && step.get<std::size_t>() < place->size()) {
       place = &(*place)[step.get<std::size_t>()];
     } else {
       *error = "the path leads nowhere in the scene (step " + std::to_string(i + 1) + ")";
@@ -50,8 +53,7 @@ bool SceneDocument::WithEdit(const Json& path, const Json& value, Json* result,
     } else {
       (*place)[last.get<std::string>()] = value;
     }
-  } else if (last.is_number_unsigned() && place->is_array() &&
-             last.get<std::size_t>() <= place->size()) {
+  } else if (IsIndex(last) && place->is_array() && last.get<std::size_t>() <= place->size()) {
     const std::size_t index = last.get<std::size_t>();
     if (value.is_null()) {
       if (index < place->size()) place->erase(index);

@@ -16,7 +16,6 @@ namespace apestudio {
 namespace {
 
 using apescene::Json;
-constexpr int kJpegQuality = 85;
 
 // The loader's message without its "<name>:<line>:<column>: " start: an edited document is
 // checked as one line of text, so its line says nothing.

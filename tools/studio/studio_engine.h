@@ -52,6 +52,9 @@ struct Outcome {
 
 class StudioEngine {
  public:
+  // The stream's JPEG quality.
+  static constexpr int kJpegQuality = 85;
+
   explicit StudioEngine(StudioOptions options);
   ~StudioEngine();
   StudioEngine(const StudioEngine&) = delete;
