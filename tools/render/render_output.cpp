@@ -23,8 +23,9 @@ std::string RenderOutput::Path(const std::string& name) const {
 }
 
 bool RenderOutput::Open(const std::string& folder, int frames, double fps, bool pictures,
-                        std::string* error) {
+                        std::string* error, int only_frame) {
   folder_ = folder;
+  only_frame_ = only_frame;
   frames_ = frames;
   fps_ = fps;
   pictures_ = pictures;
@@ -51,9 +52,11 @@ bool RenderOutput::Open(const std::string& folder, int frames, double fps, bool 
 bool RenderOutput::AddFrame(const FrameResult& frame, std::string* error) {
   stats_.Add(frame);
   if (!pictures_ || !frame.HasPicture) return true;
+  if (only_frame_ > 0 && frame.Frame != only_frame_) return true;
   if (!apescene::WritePng(Path(FrameFileName(frame.Frame, frames_)), frame.Picture, false, error))
     return false;
   ++frames_written_;
+  if (only_frame_ > 0) return true;
 
   const bool in_sheet =
       std::find(sheet_frames_.begin(), sheet_frames_.end(), frame.Frame) != sheet_frames_.end();
@@ -74,7 +77,7 @@ bool RenderOutput::AddFrame(const FrameResult& frame, std::string* error) {
 }
 
 bool RenderOutput::Finish(std::string* error) {
-  if (pictures_ && frames_written_ > 0) {
+  if (pictures_ && frames_written_ > 0 && only_frame_ == 0) {
     const apescene::Image sheet = BuildContactSheet(sheet_pictures_, kSheetColumns, 4, 0xFF202020u);
     if (!apescene::WritePng(Path("contact_sheet.png"), sheet, false, error)) return false;
     if (gif_open_) {

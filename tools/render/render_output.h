@@ -23,8 +23,10 @@ class RenderOutput {
   static constexpr int kPreviewWidth = 320;
   static constexpr double kPreviewFps = 25.0;
 
-  // Creates the folder and removes the files an earlier render left in it.
-  bool Open(const std::string& folder, int frames, double fps, bool pictures, std::string* error);
+  // Creates the folder and removes the files an earlier render left in it. With `only_frame`
+  // above 0 that frame is the one picture written (no sheet, no preview).
+  bool Open(const std::string& folder, int frames, double fps, bool pictures, std::string* error,
+            int only_frame = 0);
   bool AddFrame(const FrameResult& frame, std::string* error);
   bool Finish(std::string* error);
 
@@ -41,6 +43,7 @@ class RenderOutput {
   int frames_ = 0;
   double fps_ = 30.0;
   bool pictures_ = false;
+  int only_frame_ = 0;
   int frames_written_ = 0;
   int preview_step_ = 1;
   GifWriter gif_;
