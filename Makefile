@@ -61,7 +61,7 @@ fuzz: deps
 	  -DCMAKE_C_COMPILER=clang -DCMAKE_CXX_COMPILER=clang++ \
 	  "-DCMAKE_C_FLAGS=$(FUZZ_SANITIZE)" "-DCMAKE_CXX_FLAGS=$(FUZZ_SANITIZE)" \
 	  -DCMAKE_SHARED_LINKER_FLAGS=-fsanitize=address,undefined -DCMAKE_EXE_LINKER_FLAGS=-fsanitize=address,undefined
-	cmake --build $(FUZZ_DIR) -j $(JOBS) --target fuzz-emitter_host fuzz-scene_loader
+	cmake --build $(FUZZ_DIR) -j $(JOBS) --target fuzz-emitter_host fuzz-scene_loader fuzz-studio_request
 	fuzz/run-fuzzers $(FUZZ_DIR) $(FUZZ_SECONDS)
 
 soak: deps

@@ -4,6 +4,7 @@
 
 #include "host/qen_channel.h"
 #include "host/type_guids.h"
+#include "tools/scene/link_reference.h"
 #include "tools/scene/scene_builder.h"
 
 namespace apestudio {
@@ -47,6 +48,7 @@ Json Settings(const Json& document, const std::string& channel) {
 Json DescribeLinks(const apescene::Scene& scene, const std::string& name, Qen_Channel* channel,
                    const Json& document) {
   Json links = Json::array();
+  const std::string type_name = apescene::TypeNameOf(channel);
   const Json* written = DocumentLinks(document, name);
   for (int index = 0; index < channel->GetChildCreationCount(); ++index) {
     const ChildCreation* link = channel->GetChildCreation(index);
@@ -78,6 +80,15 @@ Json DescribeLinks(const apescene::Scene& scene, const std::string& name, Qen_Ch
                      {"many", link->LinkPosition == -1},
                      {"value", value},
                      {"choices", choices}});
+    // What the link reference says of it: its group, unit, default and meaning.
+    if (const apescene::LinkReference* reference =
+            apescene::FindLinkReference(type_name, link_name)) {
+      Json& described = links.back();
+      described["group"] = std::string(reference->Group);
+      described["unit"] = std::string(reference->Unit);
+      described["default"] = std::string(reference->Default);
+      described["help"] = std::string(reference->Meaning);
+    }
   }
   return links;
 }

@@ -10,8 +10,8 @@
 namespace apestudio {
 
 // {"channels": [{"name", "type", "settings", "links": [{"index", "name", "key", "type", "kind",
-// "many", "value", "choices"}]}]}. `kind` is "number", "yesno", "vector", "matrix", "envelope"
-// or "channel".
+// "many", "value", "choices", and from the link reference "group", "unit", "default", "help"}]}]}.
+// `kind` is "number", "yesno", "vector", "matrix", "envelope" or "channel".
 apescene::Json DescribeChannels(const apescene::Scene& scene, const apescene::Json& document);
 
 }  // namespace apestudio

@@ -40,7 +40,10 @@ bool HasJsonExtension(const std::string& name) {
 }  // namespace
 
 StudioEngine::StudioEngine(StudioOptions options)
-    : options_(std::move(options)), folder_(options_.Folder) {}
+    : options_(std::move(options)),
+      folder_(options_.Folder),
+      own_loader_(options_.Loader == nullptr ? std::make_unique<PluginLoader>() : nullptr),
+      loader_(options_.Loader != nullptr ? *options_.Loader : *own_loader_) {}
 
 StudioEngine::~StudioEngine() {
   Stop();
@@ -456,6 +459,12 @@ Json StudioEngine::State() const {
       names.push_back(name);
     }
     state["channelNames"] = names;
+    Json warnings = Json::array();
+    for (const apescene::SceneWarning& warning : scene.Warnings)
+      warnings.push_back((warning.Path.IsRoot() ? "" : warning.Path.Text() + ": ") +
+                         warning.Message);
+    state["warnings"] = warnings;
+    state["background"] = settings.Background & 0xFFFFFFu;
     state["view"] = {{"eye", VectorJson(scene.View.Eye.Sample(0.0))},
                      {"target", VectorJson(scene.View.Target.Sample(0.0))}};
   }

@@ -33,6 +33,9 @@ struct StudioOptions {
   std::string Folder;            // the folder files are read from and written to
   std::string SaveName;          // the file Save writes when given no name
   std::string DeviceKind = "gl";
+  // The plug-ins' loader, kept by the caller (e.g. one for a whole fuzzing process); null: the
+  // engine makes its own.
+  PluginLoader* Loader = nullptr;
 };
 
 // A frame as the stream sends it.
@@ -113,7 +116,8 @@ class StudioEngine {
 
   StudioOptions options_;
   SceneFolder folder_;
-  PluginLoader loader_;
+  std::unique_ptr<PluginLoader> own_loader_;
+  PluginLoader& loader_;
   TestClock clock_;
   std::unique_ptr<SceneDocument> document_;
   std::unique_ptr<SceneRun> run_;

@@ -181,12 +181,14 @@ function applyState(state) {
   if (state.frames) $('scrub').max = state.frames;
   if (state.width) $('resolution').value = state.width + 'x' + state.height;
   $('message-total').textContent = state.messageTotal ? state.messageTotal + ' messages' : '';
+  if (state.background !== undefined)
+    $('background').value = '#' + state.background.toString(16).padStart(6, '0');
   const list = $('console');
-  list.replaceChildren(...(state.messages || []).map((m) => {
-    const item = document.createElement('li');
-    item.textContent = m.text + (m.count > 1 ? '  \u00d7' + m.count : '');
-    return item;
-  }));
+  list.replaceChildren(
+    ...(state.warnings || []).map((w) => element('li', { className: 'warning', textContent: 'scene warning: ' + w })),
+    ...(state.messages || []).map((m) => element('li', {
+      textContent: m.text + (m.count > 1 ? '  \u00d7' + m.count : ''),
+    })));
   const changed = !previous || previous.undo !== state.undo || previous.redo !== state.redo ||
                   previous.scene !== state.scene;
   if (changed) loadInspector();
@@ -362,8 +364,9 @@ function element(tag, properties, children) {
   return made;
 }
 
-function numberInput(value, onChange) {
-  const input = element('input', { type: 'number', step: 'any', value: value });
+function numberInput(value, onChange, placeholder) {
+  const input = element('input', { type: 'number', step: 'any', value: value === null ? '' : value,
+                                   placeholder: placeholder || '' });
   input.onchange = () => onChange(input.value === '' ? NaN : Number(input.value), input);
   return input;
 }
@@ -383,11 +386,11 @@ function sliderRange(value) {
   return value < 0 ? [-magnitude, magnitude] : [0, magnitude];
 }
 
-function numberField(inputs, message, path, value) {
+function numberField(inputs, message, path, value, fallback) {
   const [low, high] = sliderRange(typeof value === 'number' ? value : 0);
   const slider = element('input', { type: 'range', min: low, max: high, step: (high - low) / 500,
                                     value: typeof value === 'number' ? value : 0 });
-  const number = numberInput(value, (v) => send(v));
+  const number = numberInput(value, (v) => send(v), fallback);
   const send = async (v) => {
     if (!Number.isFinite(v)) {
       // Not sent as JSON (NaN has no JSON form): the server is asked with the text, and refuses.
@@ -481,8 +484,8 @@ function yesNoField(inputs, message, path, value) {
 function linkField(channel, link) {
   const path = ['channels', channel.name, 'links', link.key];
   const title = link.name + ' (' + link.type + (link.unit ? ', ' + link.unit : '') + ')' +
-                (link.help ? ': ' + link.help : '');
-  const row = fieldRow(link.name, title, (inputs, message) => {
+                (link.help ? ': ' + link.help : '') + (link.default ? ' Empty: ' + link.default : '');
+  const build = (inputs, message) => {
     const value = link.value;
     const animated = value !== null && typeof value === 'object' && !Array.isArray(value) && 'keys' in value;
     if (link.kind === 'envelope') {
@@ -492,11 +495,15 @@ function linkField(channel, link) {
     }
     if (animated) return jsonField(inputs, message, path, value);
     if (typeof value === 'string' && link.kind !== 'channel') return channelField(inputs, message, path, link);
-    if (link.kind === 'number') return numberField(inputs, message, path, value);
+    if (link.kind === 'number') return numberField(inputs, message, path, value, link.default);
     if (link.kind === 'yesno') return yesNoField(inputs, message, path, value);
     if (link.kind === 'vector') return vectorField(inputs, message, path, value);
     if (link.kind === 'matrix') return matrixField(inputs, message, path, value);
     return channelField(inputs, message, path, link);
+  };
+  const row = fieldRow(link.name, title, (inputs, message) => {
+    build(inputs, message);
+    if (link.unit && link.kind !== 'channel') inputs.append(element('span', { className: 'note', textContent: link.unit }));
   });
   row.dataset.link = link.name;
   return row;
