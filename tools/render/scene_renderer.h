@@ -38,8 +38,9 @@ class SceneRenderer {
   // Seeds rand, builds the meshes' buffers and lets every channel initialise (an emitter's first
   // call does nothing else). Call once, before the first frame.
   void Prime();
-  // Frames are rendered in order from 1.
-  FrameResult RenderFrame(int frame);
+  // Frames are rendered in order from 1. Without `read_back` the picture is not read (a frame
+  // passed on the way to a later one); everything else happens as with it.
+  FrameResult RenderFrame(int frame, bool read_back = true);
 
  private:
   void DrawMeshes();

@@ -88,6 +88,9 @@ Json DescribeLinks(const apescene::Scene& scene, const std::string& name, Qen_Ch
       described["unit"] = std::string(reference->Unit);
       described["default"] = std::string(reference->Default);
       described["help"] = std::string(reference->Meaning);
+      // Some yes/no links do not end in "?"; the reference knows them.
+      if (described["kind"] == "number" && reference->Unit.substr(0, 6) == "yes/no")
+        described["kind"] = "yesno";
     }
   }
   return links;

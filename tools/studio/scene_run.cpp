@@ -42,9 +42,9 @@ void SceneRun::Prime() {
   renderer_->Prime();
 }
 
-aperender::FrameResult SceneRun::RenderNext() {
+aperender::FrameResult SceneRun::RenderNext(bool picture) {
   Qen_HostContext::ScopedCurrent current(&context_);
-  return renderer_->RenderFrame(++frame_);
+  return renderer_->RenderFrame(++frame_, picture);
 }
 
 void SceneRun::SetView(const D3DXVECTOR3& eye, const D3DXVECTOR3& target) {

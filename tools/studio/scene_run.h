@@ -35,8 +35,9 @@ class SceneRun {
   // Seeds rand and lets the channels initialise: call once before the first frame. A run that
   // only checks a scene is never primed, so it leaves rand alone.
   void Prime();
-  // Renders the next frame (the first is 1).
-  aperender::FrameResult RenderNext();
+  // Renders the next frame (the first is 1); without `picture` it is not read back (a frame
+  // passed on the way to a later one).
+  aperender::FrameResult RenderNext(bool picture = true);
   // The last frame rendered (0 before the first).
   int Frame() const { return frame_; }
   apescene::Scene& GetScene() { return *scene_; }

@@ -85,7 +85,8 @@ void StudioEngine::Start() {
       } else {
         queue_changed_.wait(lock, ready);
       }
-      if (stopping_) return;
+      // Work already queued still runs, so that no caller waits for ever.
+      if (stopping_ && queue_.empty()) return;
       if (!queue_.empty()) {
         std::function<void()> work = std::move(queue_.front());
         queue_.pop_front();
@@ -207,6 +208,7 @@ Outcome StudioEngine::Redo() {
 }
 
 Outcome StudioEngine::Show(const Json& before, SceneRun& checked) {
+  ++revision_;
   LinkPlace place;
   if (playing_ && run_ != nullptr && FindLiveEditableChange(before, document_->Root(), &place) &&
       CopyLinkValue(checked.GetScene(), run_->GetScene(), place))
@@ -226,7 +228,7 @@ Outcome StudioEngine::RunTo(int frame) {
   if (view_) run_->SetView(view_->first, view_->second);
   run_->Prime();
   const int target = std::clamp(frame, 1, run_->Settings().FrameCount());
-  while (run_->Frame() < target - 1) run_->RenderNext();
+  while (run_->Frame() < target - 1) run_->RenderNext(false);
   RenderAndPublish();
   return {};
 }
@@ -287,7 +289,7 @@ Outcome StudioEngine::Seek(int frame) {
   if (Exporting() || run_ == nullptr) return Outcome::Refused("an export is running");
   const int target = std::clamp(frame, 1, run_->Settings().FrameCount());
   if (target <= run_->Frame()) return RunTo(target);
-  while (run_->Frame() < target - 1) run_->RenderNext();
+  while (run_->Frame() < target - 1) run_->RenderNext(false);
   RenderAndPublish();
   return {};
 }
@@ -334,7 +336,11 @@ Outcome StudioEngine::Save(const std::string& name) {
   }
   std::error_code ec;
   std::filesystem::rename(partial, path, ec);
-  if (ec) return Outcome::Refused("cannot write " + file + ": " + ec.message());
+  if (ec) {
+    std::error_code ignored;
+    std::filesystem::remove(partial, ignored);
+    return Outcome::Refused("cannot write " + file + ": " + ec.message());
+  }
   options_.SaveName = file;
   return {};
 }
@@ -364,6 +370,7 @@ Outcome StudioEngine::OpenFile(const std::string& name) {
   document_ = std::make_unique<SceneDocument>(std::move(root));
   options_.Source.DisplayName = name;
   options_.SaveName = name;
+  ++revision_;
   return RunTo(1);
 }
 
@@ -435,6 +442,7 @@ Json StudioEngine::State() const {
                 {"device", options_.DeviceKind},
                 {"frame", Frame()},
                 {"playing", playing_},
+                {"revision", revision_},
                 {"undo", document_->UndoDepth()},
                 {"redo", document_->RedoDepth()},
                 {"exporting", Exporting()},

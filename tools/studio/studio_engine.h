@@ -125,6 +125,7 @@ class StudioEngine {
   MessageLog check_messages_;
   JpegEncoder jpeg_;
   bool playing_ = true;
+  int revision_ = 0;  // counts the document's changes, so the page knows to show it afresh
   std::optional<std::pair<D3DXVECTOR3, D3DXVECTOR3>> view_;  // eye, target
   std::chrono::steady_clock::time_point next_frame_due_;
   std::string last_error_;

@@ -24,6 +24,7 @@ from selenium import webdriver
 from selenium.webdriver.chrome.options import Options
 from selenium.webdriver.chrome.service import Service
 from selenium.webdriver.common.by import By
+from selenium.common.exceptions import StaleElementReferenceException
 from selenium.webdriver.common.keys import Keys
 from selenium.webdriver.support.ui import WebDriverWait
 
@@ -35,9 +36,13 @@ WAIT_SECONDS = 60  # an upper bound only: on a loaded machine or under the sanit
 CANVAS_DIGEST = """
 const canvas = document.getElementById('viewport');
 const data = canvas.getContext('2d').getImageData(0, 0, canvas.width, canvas.height).data;
-let hash = 0;
-for (let i = 0; i < data.length; i += 4) hash = (hash * 31 + data[i] * 7 + data[i + 1] * 3 + data[i + 2]) | 0;
-return [hash, window.studio.frames, document.getElementById('frame-label').textContent];
+let hash = 0, drawn = 0;
+for (let i = 0; i < data.length; i += 4) {
+  hash = (hash * 31 + data[i] * 7 + data[i + 1] * 3 + data[i + 2]) | 0;
+  if (data[i + 3]) drawn += 1;
+}
+return [hash, window.studio.frames, document.getElementById('frame-label').textContent, drawn,
+        canvas.width, canvas.height];
 """
 
 
@@ -87,7 +92,9 @@ class StudioPage(unittest.TestCase):
 
     @classmethod
     def wait_for(cls, condition, what='condition'):
-        return WebDriverWait(cls.browser, WAIT_SECONDS, poll_frequency=0.1).until(condition, what)
+        # The inspector is drawn afresh after each change: an element may go between two looks.
+        return WebDriverWait(cls.browser, WAIT_SECONDS, poll_frequency=0.1,
+                             ignored_exceptions=[StaleElementReferenceException]).until(condition, what)
 
     def digest(self):
         return self.browser.execute_script(CANVAS_DIGEST)
@@ -137,7 +144,8 @@ class StudioPage(unittest.TestCase):
         first = self.digest()
         self.wait_for(lambda b: self.frames_drawn() > first[1] + 5)
         second = self.digest()
-        self.assertNotEqual(first[0], second[0], 'the picture does not change between frames')
+        self.assertNotEqual(first[0], second[0],
+                            'the picture does not change between frames: %s %s' % (first, second))
         stats = self.browser.execute_script('return window.studio.lastStats')
         self.assertGreater(stats['live'], 0)
 
@@ -199,8 +207,9 @@ class StudioPage(unittest.TestCase):
         self.assertEqual(links['Lifespan_Max'], 2.25)
         self.browser.find_element(By.ID, 'open').click()
         self.wait_for(lambda b: b.execute_script('return window.studio.state.scene') == 'saved_scene.json')
-        row = self.link_row('Lifespan_Max')
-        self.assertEqual(float(row.find_element(By.CSS_SELECTOR, 'input[type=number]').get_attribute('value')), 2.25)
+        self.wait_for(lambda b: self.link_row('Lifespan_Max').find_element(
+            By.CSS_SELECTOR, 'input[type=number]').get_attribute('value') == '2.25',
+            'the opened file shows its Lifespan_Max')
         frames = self.frames_drawn()
         self.play()
         self.wait_for(lambda b: self.frames_drawn() > frames + 3, 'the opened scene plays')

@@ -157,6 +157,9 @@ TEST(StudioEngine, SavedFileRendersTheFramesTheStudioShowed) {
     EXPECT_NE(shown, original);
     EXPECT_FALSE(engine->Save("../escape.json").Ok);
     EXPECT_FALSE(engine->Save("saved.txt").Ok);
+    std::filesystem::create_directories(folder.Path() / "folder.json");
+    EXPECT_FALSE(engine->Save("folder.json").Ok);
+    EXPECT_FALSE(std::filesystem::exists(folder.Path() / "folder.json.partial"));
     ASSERT_TRUE(engine->Save("saved.json").Ok);
   }
   // The engine and its clock are gone: one test clock at a time.

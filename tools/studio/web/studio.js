@@ -85,7 +85,9 @@ async function showFrame(jpeg, stats) {
     canvas.width = bitmap.width;
     canvas.height = bitmap.height;
   }
-  canvas.getContext('2d').drawImage(bitmap, 0, 0);
+  // A canvas kept in main memory: an accelerated one loses its picture when the browser's GPU
+  // process restarts, and the page (and its tests) read the pixels back.
+  canvas.getContext('2d', { willReadFrequently: true }).drawImage(bitmap, 0, 0);
   bitmap.close();
   studio.frames += 1;
   if (stats) addStats(stats);
@@ -189,8 +191,7 @@ function applyState(state) {
     ...(state.messages || []).map((m) => element('li', {
       textContent: m.text + (m.count > 1 ? '  \u00d7' + m.count : ''),
     })));
-  const changed = !previous || previous.undo !== state.undo || previous.redo !== state.redo ||
-                  previous.scene !== state.scene;
+  const changed = !previous || previous.revision !== state.revision;
   if (changed) loadInspector();
 }
 
