@@ -31,8 +31,10 @@ demo: build
 	APE_PLUGIN_DIR=$(BUILD_DIR)/plugins $(BUILD_DIR)/bin/ape-render --out out/demo
 
 # The live editor in the browser on SCENE (default: the built-in fountain); prints the address.
+# It makes a fresh OpenGL context for every re-simulation, so Mesa's shader cache stays on here.
 studio: build
-	APE_PLUGIN_DIR=$(BUILD_DIR)/plugins $(BUILD_DIR)/bin/ape-studio $(SCENE)
+	env -u MESA_SHADER_CACHE_DISABLE APE_PLUGIN_DIR=$(BUILD_DIR)/plugins \
+	  $(BUILD_DIR)/bin/ape-studio $(SCENE)
 
 # Renders the example scenes afresh into tests/golden/, after a deliberate change of a picture.
 update-golden: build
