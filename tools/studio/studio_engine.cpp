@@ -74,8 +74,14 @@ bool StudioEngine::Open(std::string* error) {
 }
 
 void StudioEngine::Start() {
+  // An OpenGL context is current on one thread at a time, and the run's is current on this one:
+  // the run is made again on the engine's thread, and the runs end there too.
+  const int frame = Frame();
+  run_.reset();
+  resume_frame_ = frame;
   next_frame_due_ = std::chrono::steady_clock::now();
   thread_ = std::thread([this] {
+    RunTo(resume_frame_);
     for (;;) {
       std::unique_lock<std::mutex> lock(queue_mutex_);
       const bool busy = playing_ || Exporting();
@@ -86,7 +92,13 @@ void StudioEngine::Start() {
         queue_changed_.wait(lock, ready);
       }
       // Work already queued still runs, so that no caller waits for ever.
-      if (stopping_ && queue_.empty()) return;
+      if (stopping_ && queue_.empty()) {
+        lock.unlock();
+        export_run_.reset();
+        export_output_.reset();
+        run_.reset();
+        return;
+      }
       if (!queue_.empty()) {
         std::function<void()> work = std::move(queue_.front());
         queue_.pop_front();
@@ -211,8 +223,10 @@ Outcome StudioEngine::Show(const Json& before, SceneRun& checked) {
   ++revision_;
   LinkPlace place;
   if (playing_ && run_ != nullptr && FindLiveEditableChange(before, document_->Root(), &place) &&
-      CopyLinkValue(checked.GetScene(), run_->GetScene(), place))
+      CopyLinkValue(checked.GetScene(), run_->GetScene(), place)) {
+    changed_while_running_ = true;
     return {};
+  }
   return RunTo(Frame());
 }
 
@@ -226,6 +240,7 @@ Outcome StudioEngine::RunTo(int frame) {
     return Outcome::Refused(error);
   }
   if (view_) run_->SetView(view_->first, view_->second);
+  changed_while_running_ = false;
   run_->Prime();
   const int target = std::clamp(frame, 1, run_->Settings().FrameCount());
   while (run_->Frame() < target - 1) run_->RenderNext(false);
@@ -288,7 +303,7 @@ Outcome StudioEngine::Restart() {
 Outcome StudioEngine::Seek(int frame) {
   if (Exporting() || run_ == nullptr) return Outcome::Refused("an export is running");
   const int target = std::clamp(frame, 1, run_->Settings().FrameCount());
-  if (target <= run_->Frame()) return RunTo(target);
+  if (target <= run_->Frame() || changed_while_running_) return RunTo(target);
   while (run_->Frame() < target - 1) run_->RenderNext(false);
   RenderAndPublish();
   return {};
@@ -299,6 +314,7 @@ Outcome StudioEngine::SetView(const D3DXVECTOR3& eye, const D3DXVECTOR3& target)
   view_ = std::make_pair(eye, target);
   if (playing_ && run_ != nullptr) {
     run_->SetView(eye, target);
+    changed_while_running_ = true;
     return {};
   }
   return RunTo(Frame());

@@ -66,7 +66,8 @@ class StudioEngine {
   // Parses and runs the first scene and publishes its first frame. False with *error when the
   // scene or the device fails.
   bool Open(std::string* error);
-  // From now on the engine runs on its own thread, playing in real time.
+  // From now on the engine runs on its own thread, playing in real time (the current frame is
+  // made again there, where the run's device will live).
   void Start();
   void Stop();
 
@@ -126,6 +127,9 @@ class StudioEngine {
   JpegEncoder jpeg_;
   bool playing_ = true;
   int revision_ = 0;  // counts the document's changes, so the page knows to show it afresh
+  // The run took a change while running, so it is no longer the document's replay: scrubbing
+  // builds it afresh rather than going on from it.
+  bool changed_while_running_ = false;
   std::optional<std::pair<D3DXVECTOR3, D3DXVECTOR3>> view_;  // eye, target
   std::chrono::steady_clock::time_point next_frame_due_;
   std::string last_error_;

@@ -114,8 +114,16 @@ TEST(StudioEngine, EditsReachTheRunningEffect) {
   EXPECT_GE(StatsOf(*engine)["births"].get<int>(), births_before * 9);
   EXPECT_GT(StatsOf(*engine)["live"].get<int>(), live_before);
 
-  // Paused: frame 31 again, as if the rate had always been 45.
+  // Scrubbing forward from there shows the document's replay, not the run that took the change.
   engine->SetPlaying(false);
+  ASSERT_TRUE(engine->Seek(40).Ok);
+  const Json scrubbed = StatsOf(*engine);
+  ASSERT_TRUE(engine->Seek(39).Ok);
+  ASSERT_TRUE(engine->Seek(40).Ok);
+  EXPECT_EQ(StatsOf(*engine)["live"], scrubbed["live"]);
+  ASSERT_TRUE(engine->Seek(31).Ok);
+
+  // Paused: frame 31 again, as if the rate had always been 45.
   ASSERT_TRUE(engine->Edit(LinkPath("Births Per Second"), 45).Ok);
   EXPECT_EQ(engine->Frame(), 31);
   EXPECT_LT(StatsOf(*engine)["live"].get<int>(), live_before / 5);
@@ -206,6 +214,25 @@ TEST(StudioEngine, ExportWritesFramesSheetAndPreviewThenResumes) {
   EXPECT_EQ(engine->Frame(), 4);
   EXPECT_TRUE(engine->Step().Ok);
   EXPECT_EQ(engine->Frame(), 5);
+}
+
+// The engine's thread draws the same pictures as the thread that opened it (an OpenGL context
+// current on the opening thread once left the engine's thread drawing nothing).
+TEST(StudioEngine, ItsOwnThreadDrawsTheSamePictures) {
+  const ScratchFolder folder;
+  auto engine = OpenStudio(folder, "fountain.json", "gl");
+  ASSERT_NE(engine, nullptr);
+  ASSERT_TRUE(engine->Seek(20).Ok);
+  const PublishedFrame opened = Latest(*engine);
+  engine->Start();
+  PublishedFrame threaded;
+  ASSERT_TRUE(engine->WaitFrame(opened.Serial, std::chrono::seconds(60), &threaded));
+  EXPECT_EQ(threaded.Jpeg, opened.Jpeg);
+  engine->Call([&] { EXPECT_TRUE(engine->Step().Ok); });
+  ASSERT_TRUE(engine->WaitFrame(threaded.Serial, std::chrono::seconds(60), &threaded));
+  EXPECT_EQ(Json::parse(threaded.Stats)["frame"], 21);
+  EXPECT_NE(threaded.Jpeg, opened.Jpeg);
+  engine->Stop();
 }
 
 TEST(StudioEngine, OpensOnlySceneFilesOfItsFolder) {
