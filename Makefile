@@ -8,7 +8,7 @@ CMAKE_GEN = -G Ninja
 # LeakSanitizer's exit check; the tests compile few shaders, so they run without it.
 export MESA_SHADER_CACHE_DISABLE = true
 
-.PHONY: deps configure test test-sanitize demo update-golden bench format build fuzz soak
+.PHONY: deps configure test test-sanitize demo studio update-golden bench format build fuzz soak
 
 deps:
 	@scripts/install-deps
@@ -33,6 +33,13 @@ test-sanitize: deps
 demo: configure
 	cmake --build $(BUILD_DIR) -j $(JOBS) --target ape-render ape-plugins
 	APE_PLUGIN_DIR=$(BUILD_DIR)/plugins $(BUILD_DIR)/bin/ape-render --out out/demo
+
+# The live editor in the browser on SCENE (default: the built-in fountain); prints the address.
+# It makes a fresh OpenGL context for every re-simulation, so Mesa's shader cache stays on here.
+studio: configure
+	cmake --build $(BUILD_DIR) -j $(JOBS) --target ape-studio ape-plugins
+	env -u MESA_SHADER_CACHE_DISABLE APE_PLUGIN_DIR=$(BUILD_DIR)/plugins \
+	  $(BUILD_DIR)/bin/ape-studio $(SCENE)
 
 # Renders the example scenes afresh into tests/golden/, after a deliberate change of a picture.
 update-golden: build
@@ -61,7 +68,7 @@ fuzz: deps
 	  -DCMAKE_C_COMPILER=clang -DCMAKE_CXX_COMPILER=clang++ \
 	  "-DCMAKE_C_FLAGS=$(FUZZ_SANITIZE)" "-DCMAKE_CXX_FLAGS=$(FUZZ_SANITIZE)" \
 	  -DCMAKE_SHARED_LINKER_FLAGS=-fsanitize=address,undefined -DCMAKE_EXE_LINKER_FLAGS=-fsanitize=address,undefined
-	cmake --build $(FUZZ_DIR) -j $(JOBS) --target fuzz-emitter_host fuzz-scene_loader
+	cmake --build $(FUZZ_DIR) -j $(JOBS) --target fuzz-emitter_host fuzz-scene_loader fuzz-studio_request
 	fuzz/run-fuzzers $(FUZZ_DIR) $(FUZZ_SECONDS)
 
 soak: deps

@@ -60,7 +60,7 @@ void SceneRenderer::Prime() {
   device_.ForgetCalls();
 }
 
-FrameResult SceneRenderer::RenderFrame(int frame) {
+FrameResult SceneRenderer::RenderFrame(int frame, bool read_back) {
   FrameResult result;
   result.Frame = frame;
   result.Seconds = frame / fps_;
@@ -92,20 +92,23 @@ FrameResult SceneRenderer::RenderFrame(int frame) {
 
   device_.Device()->ResetTimes();
   const Clock::time_point calls = Clock::now();
+  result.ChannelMsEach.reserve(scene_.Channels.size());
   for (const auto& channel : scene_.Channels) {
+    const Clock::time_point start = Clock::now();
     // Blended particles are tested against the depth of what is drawn but do not write it, as
     // hosts draw transparent effects; otherwise each quad's clear corners would hide the
     // particles behind it. The emitter turns depth writing back on after its pass, so this is
     // set again before each channel.
     device->SetRenderState(D3DRS_ZWRITEENABLE, FALSE);
     channel->CallChannel();
+    result.ChannelMsEach.push_back(MsSince(start));
   }
   result.ChannelMs = MsSince(calls);
   result.DrawMs = device_.Device()->DrawMs();
 
   const Clock::time_point readback = Clock::now();
   device->EndScene();
-  result.HasPicture = device_.ReadPixels(&result.Picture);
+  result.HasPicture = read_back && device_.ReadPixels(&result.Picture);
   result.ReadbackMs = MsSince(readback);
   device_.ForgetCalls();
 

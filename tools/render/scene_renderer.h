@@ -19,12 +19,13 @@ class Tev_AdvancedParticleEmitter;
 namespace aperender {
 
 struct FrameResult {
-  int Frame = 0;             // from 1
-  double Seconds = 0.0;      // scene time shown
-  ParticleCounts Particles;  // all emitters together
-  double ChannelMs = 0.0;    // inside CallChannel of every channel
-  double DrawMs = 0.0;       // of which in device draw calls
-  double ReadbackMs = 0.0;   // EndScene and reading the pixels back
+  int Frame = 0;                      // from 1
+  double Seconds = 0.0;               // scene time shown
+  ParticleCounts Particles;           // all emitters together
+  double ChannelMs = 0.0;             // inside CallChannel of every channel
+  std::vector<double> ChannelMsEach;  // the same per channel, in the scene's channel order
+  double DrawMs = 0.0;                // of which in device draw calls
+  double ReadbackMs = 0.0;            // EndScene and reading the pixels back
   bool HasPicture = false;
   apescene::Image Picture;
 };
@@ -37,8 +38,9 @@ class SceneRenderer {
   // Seeds rand, builds the meshes' buffers and lets every channel initialise (an emitter's first
   // call does nothing else). Call once, before the first frame.
   void Prime();
-  // Frames are rendered in order from 1.
-  FrameResult RenderFrame(int frame);
+  // Frames are rendered in order from 1. Without `read_back` the picture is not read (a frame
+  // passed on the way to a later one); everything else happens as with it.
+  FrameResult RenderFrame(int frame, bool read_back = true);
 
  private:
   void DrawMeshes();
