@@ -88,17 +88,20 @@ class Tev_AdvancedParticleEmitter : public Tev_DX8_ObjectDataChannel {
   void RenderSprites();
 
   // --- Internal stages (public because the class is exported whole; not for hosts) ---
-  void ReadLinks();                        // frame driver, link reading stage
-  void ReadCollisionSettings();            // collision settings members and per-frame links
-  void RunLogicStep();                     // one logic step over the pool
-  void UpdateParticle(int index);          // dispatch: attached, inactive or live
-  void UpdateLiveParticle(int index);      // stages L1 to L14
+  void ReadLinks();                    // frame driver, link reading stage
+  void ReadCollisionSettings();        // collision settings members and per-frame links
+  void RunLogicStep();                 // one logic step over the pool
+  void UpdateParticles();              // each record's pending updates, in index order
+  void UpdateParticle(int index);      // dispatch: attached, inactive or live
+  void UpdateLiveParticle(int index);  // stages L1 to L14
   void UpdateAttachedParticle(Particle& particle);
-  void ApplySizeEnvelope(Particle& particle);   // live and sliding size
+  // Live and sliding size, and colour, through Step.Envelopes: the running step's views, or
+  // those UpdateParticle took.
+  void ApplySizeEnvelope(Particle& particle);
   void ApplyColorEnvelopes(Particle& particle);
-  void CollisionStage(Particle& particle);      // L8
-  void SmokeStage(int index);                   // L9a to L9f
-  void SmokeCollisionStage(Particle& particle); // L9e
+  void CollisionStage(Particle& particle);       // L8
+  void SmokeStage(int index);                    // L9a to L9f
+  void SmokeCollisionStage(Particle& particle);  // L9e
   void BuildCompositeTexture();
   void ReleaseDrawingResources();
   void ShowDebug(const char* text);     // through DebugMessages

@@ -5,6 +5,7 @@
 #include "host/smoke_settings.h"
 #include "plugin/advanced_particle_emitter.h"
 #include "plugin/link_table.h"
+#include "simulation/envelope_sampling.h"
 
 namespace {
 
@@ -33,10 +34,13 @@ void PrepareSmokePairs(Tev_AdvancedParticleEmitter& e) {
 class StepScope {
  public:
   explicit StepScope(Tev_AdvancedParticleEmitter& e) : e_(e) {
+    e.Step.Envelopes = sim::TakeMainEnvelopeViews(e);
+    e.Step.EnvelopesTaken = true;
     TakeAttractors(e);
     PrepareSmokePairs(e);
   }
   ~StepScope() {
+    e_.Step.EnvelopesTaken = false;
     e_.Step.AttractorsTaken = false;
     e_.Step.SmokePairs.Clear();
   }
@@ -51,9 +55,5 @@ class StepScope {
 
 void Tev_AdvancedParticleEmitter::RunLogicStep() {
   const StepScope scope(*this);
-  for (int i = 0; i < ParticleCount; ++i) {
-    const std::int32_t steps = Particles[i].PendingSteps;
-    for (std::int32_t k = 0; k < steps; ++k) UpdateParticle(i);
-    Particles[i].PendingSteps = 1;
-  }
+  UpdateParticles();
 }

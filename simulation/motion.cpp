@@ -5,9 +5,42 @@
 #include "host/smoke_settings.h"
 #include "plugin/advanced_particle_emitter.h"
 #include "plugin/link_table.h"
+#include "simulation/envelope_sampling.h"
 #include "simulation/vector_math.h"
 
 namespace {
+
+// What the live update branches on that holds for a whole logic step (only the link reading
+// stage changes these), read once per step instead of once per particle.
+struct LiveStepFacts {
+  bool SmokeFades;  // smoke mode with the speed limit or the global force fading with age
+  bool SpeedLimit;  // "Maximum Speed" linked
+  bool Collision;   // the collision stage runs
+  bool Smoke;       // the smoke stages run
+  bool Colours;     // the colour envelopes write the colour (not smoke debug colours)
+  bool Spin;
+  bool AlignToNormals;
+  bool LookAtLocal;
+  bool SlidingImmunity;
+  float Scale;  // SimulationScaler
+};
+
+LiveStepFacts FactsOf(const Tev_AdvancedParticleEmitter& e) {
+  const Tev_AdvPE_SmokeSettings* smoke = e.SmokeEnabled ? e.Frame.SmokeSettings : nullptr;
+  LiveStepFacts facts{};
+  facts.SmokeFades =
+      smoke && (smoke->MaxSpeedFadesWithAge > 0.0f || smoke->GlobalForceFadesWithAge > 0.0f);
+  facts.SpeedLimit = e.HasMaximumSpeed;
+  facts.Collision = e.Frame.CollisionManager && (e.ReportCollisions || e.CollisionResponse);
+  facts.Smoke = e.SmokeEnabled;
+  facts.Colours = !(smoke && smoke->DebugColours);
+  facts.Spin = e.SpinEnabled;
+  facts.AlignToNormals = e.AlignToNormals;
+  facts.LookAtLocal = e.LookAtLocal;
+  facts.SlidingImmunity = e.SlidingAttractorImmunity;
+  facts.Scale = e.SimulationScaler;
+  return facts;
+}
 
 // The speed limit m and global force G of this update, faded with age in smoke mode.
 struct FadedMotion {
@@ -17,23 +50,30 @@ struct FadedMotion {
 
 FadedMotion FadeWithAge(const Tev_AdvancedParticleEmitter& e, const Particle& p) {
   FadedMotion motion{e.MaximumSpeed, e.GlobalForce};
-  if (e.SmokeEnabled) {
-    const Tev_AdvPE_SmokeSettings& smoke = *e.Frame.SmokeSettings;
-    if (smoke.MaxSpeedFadesWithAge > 0.0f)
-      motion.MaximumSpeed = (1.0f - p.NormalizedAge) * e.MaximumSpeed;
-    if (smoke.GlobalForceFadesWithAge > 0.0f)
-      motion.GlobalForce = e.GlobalForce * (1.0f - p.NormalizedAge);
-  }
+  const Tev_AdvPE_SmokeSettings& smoke = *e.Frame.SmokeSettings;
+  if (smoke.MaxSpeedFadesWithAge > 0.0f)
+    motion.MaximumSpeed = (1.0f - p.NormalizedAge) * e.MaximumSpeed;
+  if (smoke.GlobalForceFadesWithAge > 0.0f)
+    motion.GlobalForce = e.GlobalForce * (1.0f - p.NormalizedAge);
   return motion;
 }
 
-void IntegrateVelocity(const Tev_AdvancedParticleEmitter& e, Particle& p,
-                       const FadedMotion& motion) {
-  const float s = e.SimulationScaler;
-  p.Velocity += (motion.GlobalForce + p.SmokeForce + p.AttractorForce) * s * s;
-  if (!e.HasMaximumSpeed) return;
-  const float limit = motion.MaximumSpeed * s;
+void LimitSpeed(Particle& p, float maximumSpeed, float s) {
+  const float limit = maximumSpeed * s;
   if (limit < sim::Length(p.Velocity)) p.Velocity = sim::Unit(p.Velocity) * limit;
+}
+
+void IntegrateVelocity(const Tev_AdvancedParticleEmitter& e, const LiveStepFacts& facts,
+                       Particle& p) {
+  const float s = facts.Scale;
+  if (!facts.SmokeFades) {
+    p.Velocity += (e.GlobalForce + p.SmokeForce + p.AttractorForce) * s * s;
+    if (facts.SpeedLimit) LimitSpeed(p, e.MaximumSpeed, s);
+    return;
+  }
+  const FadedMotion motion = FadeWithAge(e, p);
+  p.Velocity += (motion.GlobalForce + p.SmokeForce + p.AttractorForce) * s * s;
+  if (facts.SpeedLimit) LimitSpeed(p, motion.MaximumSpeed, s);
 }
 
 void Move(Tev_AdvancedParticleEmitter& e, Particle& p) {
@@ -43,9 +83,10 @@ void Move(Tev_AdvancedParticleEmitter& e, Particle& p) {
 }
 
 // Gathered now, applied at the next update's velocity integration.
-void GatherAttractorForce(const Tev_AdvancedParticleEmitter& e, Particle& p) {
+void GatherAttractorForce(const Tev_AdvancedParticleEmitter& e, const LiveStepFacts& facts,
+                          Particle& p) {
   p.AttractorForce = sim::kZeroVector;
-  if (p.Sliding && e.SlidingAttractorImmunity) return;
+  if (p.Sliding && facts.SlidingImmunity) return;
   if (e.Step.AttractorsTaken) {
     for (Tev_AdvPE_Attractor* attractor : e.Step.Attractors)
       p.AttractorForce += attractor->GetForceAtPosition(p.RenderPosition);
@@ -61,54 +102,80 @@ void GatherAttractorForce(const Tev_AdvancedParticleEmitter& e, Particle& p) {
 
 // "LookAt" is a point, or with "LookAt_Local" an offset from the particle; sliding particles
 // aligned to normals face along the surface normal.
-void Face(const Tev_AdvancedParticleEmitter& e, Particle& p) {
+void Face(const Tev_AdvancedParticleEmitter& e, const LiveStepFacts& facts, Particle& p) {
   if (p.Attached) return;
-  if (e.AlignToNormals && p.Sliding)
+  if (facts.AlignToNormals && p.Sliding)
     p.LookAtPoint = p.Position + p.SurfaceNormal;
-  else if (e.LookAtLocal)
+  else if (facts.LookAtLocal)
     p.LookAtPoint = p.Position + e.LookAt;
   else
     p.LookAtPoint = e.LookAt;
 }
 
 // The angle is handed to sine and cosine unconverted; it is reset (not wrapped) beyond +-360.
-void Spin(const Tev_AdvancedParticleEmitter& e, Particle& p) {
-  if (!e.SpinEnabled) return;
-  p.SpinAngle += p.SpinSpeed * e.SimulationScaler;
+void Spin(const LiveStepFacts& facts, Particle& p) {
+  if (!facts.Spin) return;
+  p.SpinAngle += p.SpinSpeed * facts.Scale;
   if (p.SpinAngle > 360.0f || p.SpinAngle < -360.0f) p.SpinAngle = 0.0f;
   p.RenderSpinAngle = p.SpinAngle;
 }
 
-bool CollisionStageRuns(const Tev_AdvancedParticleEmitter& e) {
-  return e.Frame.CollisionManager && (e.ReportCollisions || e.CollisionResponse);
-}
-
-}  // namespace
-
-void Tev_AdvancedParticleEmitter::UpdateParticle(int index) {
-  Particle& p = Particles[index];
-  if (p.Attached && p.Active)
-    UpdateAttachedParticle(p);
-  else if (p.Active)
-    UpdateLiveParticle(index);
-}
-
-void Tev_AdvancedParticleEmitter::UpdateLiveParticle(int index) {
-  Particle& p = Particles[index];
-  VerticesDirty = true;
+// The whole update of one live particle. Inline into the step's loop, with the step's facts and
+// envelope views held there.
+[[gnu::always_inline]] inline void UpdateLive(Tev_AdvancedParticleEmitter& e, int index,
+                                              const LiveStepFacts& facts,
+                                              const sim::MainEnvelopeViews& views) {
+  Particle& p = e.Particles[index];
+  e.VerticesDirty = true;
   if (p.Age > p.Lifespan) {
     p.Active = false;
     return;
   }
   p.NormalizedAge = p.Age / p.Lifespan;
-  IntegrateVelocity(*this, p, FadeWithAge(*this, p));
-  ApplySizeEnvelope(p);
+  IntegrateVelocity(e, facts, p);
+  if (p.Sliding)
+    e.ApplySizeEnvelope(p);
+  else
+    p.Size = sim::LiveSize(views, p);
   // The collision may kill, attach or redirect the particle; the stages below run on regardless.
-  if (CollisionStageRuns(*this)) CollisionStage(p);
-  if (SmokeEnabled) SmokeStage(index);
-  Move(*this, p);
-  GatherAttractorForce(*this, p);
-  Face(*this, p);
-  Spin(*this, p);
-  ApplyColorEnvelopes(p);
+  if (facts.Collision) e.CollisionStage(p);
+  if (facts.Smoke) e.SmokeStage(index);
+  Move(e, p);
+  GatherAttractorForce(e, facts, p);
+  Face(e, facts, p);
+  Spin(facts, p);
+  if (facts.Colours) p.Color = sim::LiveColor(views, p.NormalizedAge);
+}
+
+[[gnu::always_inline]] inline void Update(Tev_AdvancedParticleEmitter& e, int index,
+                                          const LiveStepFacts& facts,
+                                          const sim::MainEnvelopeViews& views) {
+  Particle& p = e.Particles[index];
+  if (p.Attached && p.Active)
+    e.UpdateAttachedParticle(p);
+  else if (p.Active)
+    UpdateLive(e, index, facts, views);
+}
+
+}  // namespace
+
+void Tev_AdvancedParticleEmitter::UpdateParticles() {
+  const LiveStepFacts facts = FactsOf(*this);
+  const sim::MainEnvelopeViews views = Step.Envelopes;
+  for (int i = 0; i < ParticleCount; ++i) {
+    const std::int32_t steps = Particles[i].PendingSteps;
+    for (std::int32_t k = 0; k < steps; ++k) Update(*this, i, facts, views);
+    Particles[i].PendingSteps = 1;
+  }
+}
+
+void Tev_AdvancedParticleEmitter::UpdateParticle(int index) {
+  // Outside a logic step the update samples the envelopes linked now.
+  if (!Step.EnvelopesTaken) Step.Envelopes = sim::TakeMainEnvelopeViews(*this);
+  Update(*this, index, FactsOf(*this), Step.Envelopes);
+}
+
+void Tev_AdvancedParticleEmitter::UpdateLiveParticle(int index) {
+  if (!Step.EnvelopesTaken) Step.Envelopes = sim::TakeMainEnvelopeViews(*this);
+  UpdateLive(*this, index, FactsOf(*this), Step.Envelopes);
 }
