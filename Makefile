@@ -8,13 +8,15 @@ CMAKE_GEN = -G Ninja
 # LeakSanitizer's exit check; the tests compile few shaders, so they run without it.
 export MESA_SHADER_CACHE_DISABLE = true
 
-.PHONY: deps test test-sanitize demo update-golden bench format build fuzz soak
+.PHONY: deps configure test test-sanitize demo update-golden bench format build fuzz soak
 
 deps:
 	@scripts/install-deps
 
-build: deps
+configure: deps
 	cmake -S . -B $(BUILD_DIR) $(CMAKE_GEN) -DCMAKE_BUILD_TYPE=RelWithDebInfo -DAPE_BUILD_BENCHMARKS=OFF
+
+build: configure
 	cmake --build $(BUILD_DIR) -j $(JOBS)
 
 test: build
@@ -26,8 +28,10 @@ test-sanitize: deps
 	ASAN_OPTIONS=detect_leaks=1 UBSAN_OPTIONS=print_stacktrace=1 \
 	  ctest --test-dir $(SAN_DIR) --output-on-failure -j $(JOBS)
 
-# Renders the built-in fountain into out/demo/: frames, contact sheet, GIF preview, stats.
-demo: build
+# Renders the built-in fountain into out/demo/: frames, contact sheet, GIF preview, stats. Builds
+# only the render tool and the plug-ins it loads, in the same build folder as the tests.
+demo: configure
+	cmake --build $(BUILD_DIR) -j $(JOBS) --target ape-render ape-plugins
 	APE_PLUGIN_DIR=$(BUILD_DIR)/plugins $(BUILD_DIR)/bin/ape-render --out out/demo
 
 # Renders the example scenes afresh into tests/golden/, after a deliberate change of a picture.

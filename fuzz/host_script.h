@@ -26,6 +26,7 @@ enum HostOp : std::uint8_t {
   kOpDevice,          // DeviceStep
   kOpRunFrames,       // frames (byte), milliseconds per frame (byte): every emitter, each frame
   kOpSeed,            // srand(the next four bytes)
+  kOpReplaceContext,  // the host context goes while every channel lives; a new one takes over
   kHostOpCount,
 };
 

@@ -4,6 +4,8 @@
 #include <cstdlib>
 #include <exception>
 #include <memory>
+#include <optional>
+#include <string>
 #include <vector>
 
 #include "fuzz/byte_reader.h"
@@ -50,6 +52,7 @@ class HostileHost {
  private:
   void Step(ByteReader& in);
   std::string Check() const;
+  std::string MessageFault() const;
   void TameParticleCounts();
 
   Tev_AdvancedParticleEmitter* EmitterAt(std::uint8_t selector) const;
@@ -62,9 +65,16 @@ class HostileHost {
   void DeviceStep(ByteReader& in);
   MemoryDevice* HeldDevice() const;
 
-  Qen_HostContext context_;
-  Qen_HostContext::ScopedCurrent current_{&context_};
-  MessageWatch messages_{context_};
+  void ReplaceContext();
+
+  // The context can go while channels live (kOpReplaceContext); a message fault of an earlier
+  // context is kept.
+  std::unique_ptr<Qen_HostContext> context_ = std::make_unique<Qen_HostContext>();
+  std::optional<Qen_HostContext::ScopedCurrent> current_{std::in_place, context_.get()};
+  std::unique_ptr<MessageWatch> messages_ = std::make_unique<MessageWatch>(*context_);
+  std::string earlier_message_fault_;
+  // The first fault a frame call left in what it drew from.
+  std::string frame_fault_;
   TestClock clock_;
   MemoryDevice* device_;
   MemoryDevice* other_device_;
@@ -110,7 +120,7 @@ std::string HostileHost::Run(ByteReader& in) {
 std::string HostileHost::TearDown() {
   emitters_.clear();
   pool_.Clear();
-  std::string fault = messages_.Fault();
+  std::string fault = MessageFault();
   for (MemoryDevice* device : {device_, other_device_}) {
     if (fault.empty() && device->LiveObjectCount() != 0)
       fault = std::to_string(device->LiveObjectCount()) +
@@ -122,9 +132,24 @@ std::string HostileHost::TearDown() {
 std::string HostileHost::Check() const {
   for (const auto& emitter : emitters_) {
     std::string fault = CheckEmitter(*emitter);
+    if (fault.empty()) fault = CheckDrawnState(*emitter, false, false);
     if (!fault.empty()) return fault;
   }
-  return messages_.Fault();
+  if (!frame_fault_.empty()) return frame_fault_;
+  return MessageFault();
+}
+
+std::string HostileHost::MessageFault() const {
+  return earlier_message_fault_.empty() ? messages_->Fault() : earlier_message_fault_;
+}
+
+void HostileHost::ReplaceContext() {
+  if (earlier_message_fault_.empty()) earlier_message_fault_ = messages_->Fault();
+  messages_.reset();
+  current_.reset();
+  context_ = std::make_unique<Qen_HostContext>();
+  current_.emplace(context_.get());
+  messages_ = std::make_unique<MessageWatch>(*context_);
 }
 
 void HostileHost::TameParticleCounts() {
@@ -164,7 +189,15 @@ void HostileHost::SetLink(Tev_AdvancedParticleEmitter& emitter, int link, Qen_Ch
 void HostileHost::Call(Tev_AdvancedParticleEmitter& emitter) {
   if (calls_ >= kMaximumCalls) return;
   ++calls_;
+  // Whether this call passes the frame gate and simulates, judged before it runs.
+  const bool working = emitter.Initialized && emitter.GetHostContext() != nullptr &&
+                       emitter.GetHostContext()->GetFrameCounter() != emitter.LastFrameCounter;
+  const bool simulates = working && emitter.GetChild(kLinkEmitterActive) &&
+                         emitter.GetChild(kLinkLogicUpdatesPerSecond) &&
+                         emitter.GetChild(kLinkBirthsPerSecond);
   emitter.CallChannel();
+  if (frame_fault_.empty())
+    frame_fault_ = CheckDrawnState(emitter, simulates, working && emitter.VerticesDirty);
 }
 
 void HostileHost::SetValue(Tev_AdvancedParticleEmitter& emitter, int link, ByteReader& in) {
@@ -367,7 +400,7 @@ void HostileHost::Step(ByteReader& in) {
       break;
     case kOpCallChannel: {
       Tev_AdvancedParticleEmitter* emitter = EmitterAt(in.Byte());
-      if (in.Flag()) context_.AdvanceFrame();
+      if (in.Flag()) context_->AdvanceFrame();
       if (emitter != nullptr) Call(*emitter);
       break;
     }
@@ -405,11 +438,14 @@ void HostileHost::Step(ByteReader& in) {
       const std::int64_t ticks = in.Byte() * kTicksPerMs;
       for (int f = 0; f < frames; ++f) {
         clock_.Advance(ticks);
-        context_.AdvanceFrame();
+        context_->AdvanceFrame();
         for (const auto& emitter : emitters_) Call(*emitter);
       }
       break;
     }
+    case kOpReplaceContext:
+      ReplaceContext();
+      break;
     default:
       std::srand(in.Dword());
       break;

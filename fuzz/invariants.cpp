@@ -2,11 +2,14 @@
 
 #include <malloc.h>
 
+#include <algorithm>
+#include <cmath>
 #include <cstring>
 
 #include "host/host_context.h"
 #include "plugin/advanced_particle_emitter.h"
 #include "render/render_sizes.h"
+#include "simulation/blend_factor.h"
 
 namespace apefuzz {
 
@@ -26,7 +29,64 @@ std::string ShortArray(const char* name, std::size_t have, std::size_t need) {
          std::to_string(need);
 }
 
+// Finite and below 1e18 in every component: sums and squares of such values stay finite.
+constexpr float kModerate = 1e18f;
+bool Moderate(float value) {
+  return std::fabs(value) < kModerate;
+}
+bool Moderate(const D3DXVECTOR3& v) {
+  return Moderate(v.x) && Moderate(v.y) && Moderate(v.z);
+}
+bool Finite(const D3DXVECTOR3& v) {
+  return std::isfinite(v.x) && std::isfinite(v.y) && std::isfinite(v.z);
+}
+
+std::string AtSlot(const char* what, std::size_t slot) {
+  return std::string(what) + " of slot " + std::to_string(slot) + " is not finite";
+}
+
+std::string CheckRenderPositions(const Tev_AdvancedParticleEmitter& e) {
+  for (std::size_t i = 0; i < e.Particles.size(); ++i) {
+    const Particle& p = e.Particles[i];
+    if (Moderate(p.Position) && Moderate(p.Velocity) && !Finite(p.RenderPosition))
+      return AtSlot("the drawn position", i);
+  }
+  return "";
+}
+
+bool DrawnInputsModerate(const Tev_AdvancedParticleEmitter& e, const Particle& p) {
+  return Moderate(p.RenderPosition) && Moderate(p.LookAtPoint) && Moderate(p.Size) &&
+         (!e.SpinEnabled || std::isfinite(p.RenderSpinAngle));
+}
+
+std::string CheckVertexPositions(const Tev_AdvancedParticleEmitter& e) {
+  const std::size_t slots = std::min(DrawnSlotCount(e.ParticleCount), e.Particles.size());
+  for (std::size_t i = 0; i < slots; ++i) {
+    if (!DrawnInputsModerate(e, e.Particles[i])) continue;
+    if (e.HardwareParticles && e.PointSpriteVertices != nullptr &&
+        !Finite(e.PointSpriteVertices[i].Position))
+      return AtSlot("the point sprite", i);
+    if (!e.HardwareParticles && e.LocalVertices != nullptr) {
+      for (std::size_t corner = 0; corner < kCornersPerQuad; ++corner)
+        if (!Finite(e.LocalVertices[i * kCornersPerQuad + corner].Position))
+          return AtSlot("a quad corner", i);
+    }
+  }
+  return "";
+}
+
 }  // namespace
+
+std::string CheckDrawnState(const Tev_AdvancedParticleEmitter& e, bool simulated, bool rebuilt) {
+  const float t = sim::BlendFactor(e);
+  if (!(t >= 0.0f && t <= 1.0f))
+    return "the blend factor " + std::to_string(t) + " is not in [0, 1]";
+  if (simulated) {
+    std::string fault = CheckRenderPositions(e);
+    if (!fault.empty()) return fault;
+  }
+  return rebuilt ? CheckVertexPositions(e) : "";
+}
 
 std::string CheckEmitter(const Tev_AdvancedParticleEmitter& e) {
   if (e.ParticleCount < 0 || e.Particles.size() != static_cast<std::size_t>(e.ParticleCount))

@@ -17,16 +17,6 @@ constexpr SiblingLink kLinks[Tev_AdvPE_Attractor::kLinkCount] = {
     {"Vortex Axis", "Value Vector", kValueVectorGuid},
 };
 
-// The field's value, or the linked one when the link is present.
-float ValueOr(const Qen_Channel& owner, int index, float field) {
-  Qen_ValueChannel* link = ValueLink(owner, index);
-  return link ? link->GetValue() : field;
-}
-D3DXVECTOR3 VectorOr(const Qen_Channel& owner, int index, const D3DXVECTOR3& field) {
-  Qen_ValueVectorChannel* link = VectorLink(owner, index);
-  return link ? link->GetVector() : field;
-}
-
 // f(r) of the field's description in the header.
 double FalloffFactor(bool linear, double minimum_radius, double radius, double r) {
   if (linear) {

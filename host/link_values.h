@@ -24,3 +24,19 @@ inline Qen_ValueChannel* ValueLink(const Qen_Channel& owner, int index) {
 inline Qen_ValueVectorChannel* VectorLink(const Qen_Channel& owner, int index) {
   return LinkAs<Qen_ValueVectorChannel>(owner, index);
 }
+
+// The linked value, or `absent` when the link is missing.
+inline float ValueOr(const Qen_Channel& owner, int index, float absent) {
+  Qen_ValueChannel* link = ValueLink(owner, index);
+  return link ? link->GetValue() : absent;
+}
+inline D3DXVECTOR3 VectorOr(const Qen_Channel& owner, int index, const D3DXVECTOR3& absent) {
+  Qen_ValueVectorChannel* link = VectorLink(owner, index);
+  return link ? link->GetVector() : absent;
+}
+
+// The linked yes/no value; no when the link is missing.
+inline bool YesOrNo(const Qen_Channel& owner, int index) {
+  Qen_ValueChannel* link = ValueLink(owner, index);
+  return link && IsYes(link->GetValue());
+}

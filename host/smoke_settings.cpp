@@ -44,12 +44,6 @@ float NumberOr(const Qen_Channel& owner, int index, float fallback) {
   return std::isfinite(value) ? value : fallback;
 }
 
-// The linked yes/no value; no when the link is missing.
-bool YesOrNo(const Qen_Channel& owner, int index) {
-  Qen_ValueChannel* link = ValueLink(owner, index);
-  return link && IsYes(link->GetValue());
-}
-
 float YesOrNoAsNumber(const Qen_Channel& owner, int index) {
   return YesOrNo(owner, index) ? 1.0f : 0.0f;
 }

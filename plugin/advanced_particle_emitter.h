@@ -88,8 +88,11 @@ class Tev_AdvancedParticleEmitter : public Tev_DX8_ObjectDataChannel {
   void RenderSprites();
 
   // --- Internal stages (public because the class is exported whole; not for hosts) ---
-  void ReadLinks();                    // frame driver, link reading stage
-  void ReadCollisionSettings();        // collision settings members and per-frame links
+  void ReadLinks();  // frame driver, link reading stage
+  // The collision settings members and per-frame links, read at their places in the stage.
+  void ReadCollisionFlags();
+  void ReadAttachedSettings();
+  void ReadCollisionOutcomes();
   void RunLogicStep();                 // one logic step over the pool
   void UpdateParticles();              // each record's pending updates, in index order
   void UpdateParticle(int index);      // dispatch: attached, inactive or live

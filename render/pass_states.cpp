@@ -75,15 +75,16 @@ IDirect3DDevice9* CurrentDevice(Tev_DX8_DeviceChannel* channel) {
 }
 
 void RunTexturedPass(Tev_AdvancedParticleEmitter& emitter, PassDraw draw, DepthAfterFading depth) {
-  Tev_DX8_DeviceChannel* channel = emitter.DeviceChannel;
-  if (channel == nullptr) return;
   if (!emitter.UseVertexAlphaFading) {
+    // The base finds its device at draw time; the emitter's device channel is not needed here.
     // The base's own states, not the emitter's empty override.
     emitter.Tev_DX8_ObjectDataChannel::DoCustomPreRenderStates();
     BindParticleTexture(emitter);
     draw(emitter);
     return;
   }
+  Tev_DX8_DeviceChannel* channel = emitter.DeviceChannel;
+  if (channel == nullptr) return;
   const KeptBlendStates kept = KeepBlendStates(channel);
   BindFadingTexture(emitter);
   SetFadingStates(*channel);

@@ -1,33 +1,24 @@
-// The collision settings members and the output links, re-read every working frame.
+// The collision settings members and the output links, re-read every working frame. The link
+// reading stage calls these at their places in its order.
 #include "host/link_channels.h"
 #include "plugin/advanced_particle_emitter.h"
 #include "plugin/link_reading.h"
 #include "plugin/link_table.h"
 
-namespace {
-
-float ValueOr(const Tev_AdvancedParticleEmitter& e, int index, float absent) {
-  Qen_ValueChannel* link = ValueLink(e, index);
-  return link ? link->GetValue() : absent;
-}
-
-bool YesOrNo(const Tev_AdvancedParticleEmitter& e, int index) {
-  Qen_ValueChannel* link = ValueLink(e, index);
-  return link && IsYes(link->GetValue());
-}
-
-}  // namespace
-
-void Tev_AdvancedParticleEmitter::ReadCollisionSettings() {
-  AttachedSizeOffsetAdditive = YesOrNo(*this, kLinkAttachedSizeOffsetAdditive);
+void Tev_AdvancedParticleEmitter::ReadCollisionFlags() {
   BouncingReportCollisions = YesOrNo(*this, kLinkBouncingReportCollisions);
   SlidingAttractorImmunity = YesOrNo(*this, kLinkSlidingAttractorImmunity);
   AlignToNormals = YesOrNo(*this, kLinkAlignToNormals);
+}
+
+void Tev_AdvancedParticleEmitter::ReadAttachedSettings() {
   AttachedSlideRate = ValueOr(*this, kLinkAttachedSlideRate, 0.0f);
   // Without an attached lifespan attached particles never end.
   AttachedLifespan = ValueOr(*this, kLinkAttachedLifespan, -1.0f);
   AttachedSlidingHeight = ValueOr(*this, kLinkAttachedSlidingHeight, 0.0f);
+}
 
+void Tev_AdvancedParticleEmitter::ReadCollisionOutcomes() {
   ReportCollisions = false;
   if (Qen_ValueChannel* report = ValueLink(*this, kLinkCollisionReportRate)) {
     CollisionReportRate = report->GetValue();

@@ -1,5 +1,6 @@
 // CallChannel: once per host frame, read the links, measure real time, give birth at the birth
 // rate, run the fixed-rate logic steps, blend for drawing, rebuild the vertex data and draw.
+#include <cmath>
 #include <cstdint>
 #include <cstdlib>
 #include <limits>
@@ -8,6 +9,7 @@
 #include "plugin/advanced_particle_emitter.h"
 #include "plugin/link_reading.h"
 #include "plugin/link_table.h"
+#include "simulation/blend_factor.h"
 
 namespace {
 
@@ -73,20 +75,16 @@ void RunBirths(Tev_AdvancedParticleEmitter& e, float ms) {
   }
 }
 
-// A rate that is not above 0 (0, negative or NaN) runs no logic step: its interval is infinite.
-bool LogicRateUsable(const Tev_AdvancedParticleEmitter& e) {
-  return e.LogicUpdatesPerSecond > 0.0f;
-}
-
 void ReadLogicRate(Tev_AdvancedParticleEmitter& e) {
   const float rate = ValueLink(e, kLinkLogicUpdatesPerSecond)->GetValue();
   if (rate == e.LogicUpdatesPerSecond) return;
   e.LogicUpdatesPerSecond = rate;
-  e.LogicInterval = LogicRateUsable(e) ? 1000.0f / rate : std::numeric_limits<float>::infinity();
+  e.LogicInterval =
+      sim::LogicRateUsable(rate) ? 1000.0f / rate : std::numeric_limits<float>::infinity();
 }
 
 void RunLogicSteps(Tev_AdvancedParticleEmitter& e) {
-  if (!LogicRateUsable(e)) return;
+  if (!sim::LogicRateUsable(e.LogicUpdatesPerSecond)) return;
   int steps = 0;
   while (e.LogicAccumulator > e.LogicInterval) {
     e.VerticesDirty = false;
@@ -99,13 +97,6 @@ void RunLogicSteps(Tev_AdvancedParticleEmitter& e) {
     }
     e.RunLogicStep();
   }
-}
-
-// The banked time as a fraction of one logic step, at most 1.
-float BlendFactor(const Tev_AdvancedParticleEmitter& e) {
-  if (!LogicRateUsable(e)) return 0.0f;
-  const float t = e.LogicAccumulator / e.LogicInterval;
-  return t > 1.0f ? 1.0f : t;
 }
 
 bool SimulationLinksPresent(const Tev_AdvancedParticleEmitter& e) {
@@ -125,7 +116,7 @@ void Simulate(Tev_AdvancedParticleEmitter& e) {
   e.LogicAccumulator += elapsed.Ms;
   RunLogicSteps(e);
 
-  e.InterpolateParticles(BlendFactor(e));
+  e.InterpolateParticles(sim::BlendFactor(e));
 }
 
 void RebuildVerticesAndDraw(Tev_AdvancedParticleEmitter& e) {
@@ -145,8 +136,31 @@ void RebuildVerticesAndDraw(Tev_AdvancedParticleEmitter& e) {
 
 }  // namespace
 
+namespace sim {
+
+// Any other rate (0, negative, NaN or infinite) has an infinite interval: an infinite rate would
+// otherwise give an interval of 0, a capped frame every frame and a blend of 0 / 0.
+bool LogicRateUsable(float logicUpdatesPerSecond) {
+  return std::isfinite(logicUpdatesPerSecond) && logicUpdatesPerSecond > 0.0f;
+}
+
+// Never below 0 either: only a clock that ran backwards banks negative time, and the drawing must
+// not run ahead of the steps.
+float BlendFactor(const Tev_AdvancedParticleEmitter& e) {
+  if (!LogicRateUsable(e.LogicUpdatesPerSecond)) return 0.0f;
+  const float t = e.LogicAccumulator / e.LogicInterval;
+  if (!(t > 0.0f)) return 0.0f;
+  return t > 1.0f ? 1.0f : t;
+}
+
+}  // namespace sim
+
 void Tev_AdvancedParticleEmitter::CallChannel() {
+  // A channel whose host context is gone has no frame counter and no host to draw for.
+  if (HostContext == nullptr) return;
   try {
+    // Created before the host's device channel: take it now, before anything builds or draws.
+    if (DeviceChannel == nullptr) DeviceChannel = FindDeviceChannel();
     if (!Initialized) {
       Initialize();
       return;

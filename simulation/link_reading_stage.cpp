@@ -139,19 +139,21 @@ void ReserveStepMemory(Tev_AdvancedParticleEmitter& e) {
 }  // namespace
 
 void Tev_AdvancedParticleEmitter::ReadLinks() {
+  // Each link is read at its place in this order: a host may watch its channels being read.
   ReadMainEnvelopes(*this);
+  AttachedSizeOffsetAdditive = YesOrNo(*this, kLinkAttachedSizeOffsetAdditive);
   CheckRebuild(*this);
+  ReadCollisionFlags();
   KeepOrRead(*this, kLinkSizeOffsetMax, &SizeOffsetMax);
   ReadSmoke(*this);
-  Qen_ValueChannel* fading = ValueLink(*this, kLinkUseVertexAlphaFading);
-  UseVertexAlphaFading = fading && IsYes(fading->GetValue());
+  UseVertexAlphaFading = YesOrNo(*this, kLinkUseVertexAlphaFading);
+  ReadAttachedSettings();
   ReadSimulationScaler(*this);
   ReadSpin(*this);
   if (auto* motion = LinkAs<Qen_MatrixChannel>(*this, kLinkEmitterMotion))
     EmitterMotion = motion->GetMatrix();
-  // The collision settings, the output links and the reset of "Out: Collision ID" come after the
-  // smoke settings were fetched, as the frame order has it.
-  ReadCollisionSettings();
+  // The reset of "Out: Collision ID" comes after the smoke settings were fetched.
+  ReadCollisionOutcomes();
   ReadMotionAndBirthSettings(*this);
   HoldFrameLinks(*this);
   ReserveStepMemory(*this);

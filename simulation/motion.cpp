@@ -132,6 +132,9 @@ void Spin(const LiveStepFacts& facts, Particle& p) {
     return;
   }
   p.NormalizedAge = p.Age / p.Lifespan;
+  // Only the smoke stage sets and clears the smoke force: with smoke off it must not keep
+  // pushing with what it gathered last.
+  if (!facts.Smoke) p.SmokeForce = sim::kZeroVector;
   IntegrateVelocity(e, facts, p);
   if (p.Sliding)
     e.ApplySizeEnvelope(p);

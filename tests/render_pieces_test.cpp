@@ -105,6 +105,12 @@ TEST(RenderOutputTest, PicturesMakeFramesSheetAndPreviewAndStaleFramesGo) {
   ASSERT_EQ(DGifSlurp(gif), GIF_OK);
   EXPECT_EQ(gif->ImageCount, 2);
   DGifCloseFile(gif, &code);
+  // Every output follows the user's umask alike (the preview was owner-only).
+  const auto permissions = [&](const char* name) {
+    return std::filesystem::status(folder.File(name)).permissions();
+  };
+  EXPECT_EQ(permissions("preview.gif"), permissions("contact_sheet.png"));
+  EXPECT_EQ(permissions("preview.gif"), permissions("stats.csv"));
 }
 
 class ParticleCensusTest : public ::testing::Test {

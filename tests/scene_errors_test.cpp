@@ -1,6 +1,7 @@
 // Every kind of fault in a scene file gives one message naming the file, the line and the place
 // in the document.
 #include <gtest/gtest.h>
+#include <ostream>
 
 #include <fstream>
 
@@ -13,6 +14,8 @@ struct ErrorCase {
   const char* Name;
   std::string Text;
   std::string Message;
+  // Failures name the case, not its bytes.
+  friend void PrintTo(const ErrorCase& c, std::ostream* os) { *os << c.Name; }
 };
 
 class SceneErrorTest : public ::testing::TestWithParam<ErrorCase> {};
@@ -110,6 +113,8 @@ struct FileCase {
   const char* File;
   const char* Contents;  // null: the file does not exist
   const char* Problem;   // after the quoted path
+  // Failures name the case, not its bytes.
+  friend void PrintTo(const FileCase& c, std::ostream* os) { *os << c.Where; }
 };
 
 class SceneFileErrorTest : public ::testing::TestWithParam<FileCase> {};

@@ -1,5 +1,6 @@
 // Every kind of value a scene can give, and what it becomes in the host graph.
 #include <gtest/gtest.h>
+#include <ostream>
 
 #include <cmath>
 #include <fstream>
@@ -70,6 +71,8 @@ struct ValueCase {
   std::string Links;  // the emitter's links, or a whole scene when it has no "fx"
   int Link;
   std::string Expected;
+  // Failures name the case, not its bytes.
+  friend void PrintTo(const ValueCase& c, std::ostream* os) { *os << c.Name; }
 };
 
 class ValueKindTest : public SceneValueTest, public ::testing::WithParamInterface<ValueCase> {};
@@ -214,6 +217,8 @@ struct AnimatedCase {
   int Link;
   std::vector<double> Seconds;
   std::string Expected;  // the link at each of those times, joined by "; "
+  // Failures name the case, not its bytes.
+  friend void PrintTo(const AnimatedCase& c, std::ostream* os) { *os << c.Name; }
 };
 
 class AnimatedValueTest : public SceneValueTest,

@@ -3,6 +3,7 @@
 // in a 2 x 2 sheet. `make update-golden` (APE_UPDATE_GOLDEN=1) writes the pictures afresh
 // instead, after a deliberate change of the picture. Skipped where no GL context can be made.
 #include <gtest/gtest.h>
+#include <ostream>
 
 #include <cstdlib>
 #include <filesystem>
@@ -122,6 +123,8 @@ struct AlterationCase {
   const char* Name;
   const char* From;
   const char* To;
+  // Failures name the case, not its bytes.
+  friend void PrintTo(const AlterationCase& c, std::ostream* os) { *os << c.Name; }
 };
 
 class AlteredSceneTest : public ::testing::TestWithParam<AlterationCase> {};

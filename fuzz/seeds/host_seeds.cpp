@@ -321,6 +321,26 @@ ScriptWriter BirthAfterEnvelopeWentAway() {
   return w;
 }
 
+ScriptWriter InfiniteLogicRate() {
+  W w = Basics();
+  Frames(w, 3);
+  w.Op(kOpSetValue).Byte(kLinkLogicUpdatesPerSecond).Special(kValueInfinity);
+  Frames(w, 3);
+  return w;
+}
+
+ScriptWriter HostContextGoesFirst() {
+  W w = Basics();
+  Frames(w, 3);
+  w.Op(kOpReplaceContext);
+  Frames(w, 2);
+  w.Call(kFirst, kCallGetParticlePosition).SmallIndex(0);
+  w.Call(kFirst, kCallBirthParticle).SmallIndex(0);
+  w.Op(kOpCreateEmitter);
+  w.Op(kOpRunFrames).Byte(2).Byte(16);
+  return w;
+}
+
 std::vector<NamedScript> HostSeeds() {
   std::vector<std::pair<std::string, W>> scripts;
   scripts.emplace_back("basic_fountain", BasicFountain());
@@ -344,6 +364,8 @@ std::vector<NamedScript> HostSeeds() {
   scripts.emplace_back("clock_extremes", ClockExtremes());
   scripts.emplace_back("spin_and_look_at", SpinAndLookAt());
   scripts.emplace_back("finding_birth_after_envelope_gone", BirthAfterEnvelopeWentAway());
+  scripts.emplace_back("finding_infinite_logic_rate", InfiniteLogicRate());
+  scripts.emplace_back("finding_host_context_goes_first", HostContextGoesFirst());
   std::vector<NamedScript> seeds;
   for (auto& [name, writer] : scripts) seeds.push_back({name, writer.Bytes()});
   return seeds;

@@ -48,4 +48,11 @@ TEST(HostileHost, BirthAfterEnvelopeWentAway) {
   EXPECT_EQ(RunScript(apefuzz::BirthAfterEnvelopeWentAway()), "");
 }
 
+// Found by review, now seen by the invariants: an infinite logic rate blended 0 / 0 into every
+// drawn position, and a frame call after the host context went away crashed.
+TEST(HostileHost, InfiniteLogicRateAndHostContextGoingFirst) {
+  EXPECT_EQ(RunScript(apefuzz::InfiniteLogicRate()), "");
+  EXPECT_EQ(RunScript(apefuzz::HostContextGoesFirst()), "");
+}
+
 }  // namespace

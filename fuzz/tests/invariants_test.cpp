@@ -1,5 +1,6 @@
 // The invariant checks themselves: each must notice the fault it stands for.
 #include <memory>
+#include <ostream>
 #include <vector>
 
 #include <gtest/gtest.h>
@@ -68,6 +69,8 @@ TEST_F(InvariantTest, PoolOfAnotherSizeIsCaught) {
 struct ShortArrayCase {
   const char* Name;
   bool PointSprites;
+  // Failures name the case, not its bytes.
+  friend void PrintTo(const ShortArrayCase& c, std::ostream* os) { *os << c.Name; }
 };
 
 class ShortArray : public InvariantTest, public testing::WithParamInterface<ShortArrayCase> {};

@@ -2,6 +2,7 @@
 #include <filesystem>
 #include <fstream>
 #include <iterator>
+#include <ostream>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -36,6 +37,8 @@ TEST(SceneInput, ExampleScenesLoadAndRun) {
 struct HostileText {
   const char* Name;
   const char* Text;
+  // Failures name the case, not its bytes.
+  friend void PrintTo(const HostileText& c, std::ostream* os) { *os << c.Name; }
 };
 
 class HostileScene : public testing::TestWithParam<HostileText> {};
@@ -71,6 +74,8 @@ struct RefusalCase {
   const char* Name;
   std::string_view Text;
   const char* RefusalStart;  // the message's beginning (a type list may follow)
+  // Failures name the case, not its bytes.
+  friend void PrintTo(const RefusalCase& c, std::ostream* os) { *os << c.Name; }
 };
 
 class Refusal : public testing::TestWithParam<RefusalCase> {};

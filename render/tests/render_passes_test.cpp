@@ -124,4 +124,31 @@ TEST_F(RenderPassTest, SwitchedOffBaseOperationsTouchNothing) {
   EXPECT_TRUE(TakeCalls().empty());
 }
 
+// An emitter without a device channel of its own (made before the host had one): the quad pass
+// without fading still draws, since the base finds the device when it draws; the fading pass
+// needs the emitter's channel for its states and stays out.
+TEST_F(RenderPassTest, WithoutItsDeviceChannelOnlyTheFadingQuadPassStaysOut) {
+  const Calls draw = SetUpPass(false, Textures::None);
+  Emitter().Tev_DX8_ObjectDataChannel::DoCustomPreRenderStates();
+  Calls expected = TakeCalls();
+  Append(expected, draw);
+  Emitter().DeviceChannel = nullptr;
+  Emitter().UseVertexAlphaFading = false;
+  Emitter().RenderSprites();
+  EXPECT_EQ(TakeCalls(), expected);
+  Emitter().UseVertexAlphaFading = true;
+  Emitter().RenderSprites();
+  EXPECT_TRUE(TakeCalls().empty());
+}
+
+// The frame call takes the host's device channel when the emitter was made before it.
+TEST_F(RenderPassTest, AFrameTakesADeviceChannelMadeAfterTheEmitter) {
+  device_channel_.reset();
+  emitter_ = std::make_unique<Tev_AdvancedParticleEmitter>();
+  ASSERT_EQ(Emitter().DeviceChannel, nullptr);
+  device_channel_ = std::make_unique<Tev_DX8_DeviceChannel>(device_);
+  Emitter().CallChannel();
+  EXPECT_EQ(Emitter().DeviceChannel, device_channel_.get());
+}
+
 }  // namespace

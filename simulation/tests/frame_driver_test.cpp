@@ -3,8 +3,11 @@
 #include <algorithm>
 #include <cmath>
 #include <limits>
+#include <memory>
 #include <optional>
+#include <vector>
 
+#include "host/type_guids.h"
 #include "simulation/tests/emitter_fixture.h"
 
 namespace {
@@ -158,15 +161,15 @@ TEST_F(FrameDriver, RebuildsOnlyWhenTheCountOrTheDrawingPathReadsDifferently) {
   }
 }
 
-// 0, negative or NaN, from the start or replacing a usable rate: no step, blend factor 0 and no
-// overload message.
+// 0, negative, NaN or infinite, from the start or replacing a usable rate: no step, blend factor
+// 0 and no overload message.
 TEST_F(FrameDriver, AnUnusableLogicRateRunsNoStep) {
   LinkBasics(2.0f, 0.0f, 0.0f);
   Start();
   PlaceParticle(0, kZero, {0.0f, 0.0f, 1.0f});
   RunFrames(2, 50.0);
   EXPECT_EQ(P(0).RenderPosition, kZero);
-  for (float rate : {0.0f, -5.0f, kNaN}) {
+  for (float rate : {0.0f, -5.0f, kNaN, std::numeric_limits<float>::infinity()}) {
     SetValue(kLinkLogicUpdatesPerSecond, 50.0f);
     emitter->LogicAccumulator = 0.0f;
     PlaceParticle(0, kZero, {0.0f, 0.0f, 1.0f});
@@ -176,6 +179,125 @@ TEST_F(FrameDriver, AnUnusableLogicRateRunsNoStep) {
     EXPECT_EQ(P(0).RenderPosition, D3DXVECTOR3(0.0f, 0.0f, 2.0f)) << rate;
   }
   EXPECT_TRUE(overloadMessages.empty());
+}
+
+// A clock that runs backwards banks negative time; the drawing stays at the last step.
+TEST_F(FrameDriver, ABackwardClockBlendsNoFurtherBack) {
+  LinkBasics(2.0f, 50.0f, 0.0f);
+  Start();
+  PlaceParticle(0, kZero, {0.0f, 0.0f, 1.0f});
+  clock.Advance(-TestClock::kTicksPerSecond / 100);
+  context.AdvanceFrame();
+  emitter->CallChannel();
+  EXPECT_LT(emitter->LogicAccumulator, 0.0f);
+  EXPECT_EQ(P(0).RenderPosition, kZero);
+}
+
+// Link channels that record, in order, the emitter links they stand at as they are read or
+// written.
+using ReadLog = std::vector<int>;
+class RecordingValue : public Qen_ValueChannel {
+ public:
+  RecordingValue(int link, ReadLog* log) : link_(link), log_(log) {}
+  float GetValue() override { return log_->push_back(link_), Qen_ValueChannel::GetValue(); }
+  void SetValue(float value) override { log_->push_back(link_), Qen_ValueChannel::SetValue(value); }
+
+ private:
+  int link_;
+  ReadLog* log_;
+};
+class RecordingVector : public Qen_ValueVectorChannel {
+ public:
+  RecordingVector(int link, ReadLog* log) : link_(link), log_(log) {}
+  D3DXVECTOR3 GetVector() override {
+    return log_->push_back(link_), Qen_ValueVectorChannel::GetVector();
+  }
+
+ private:
+  int link_;
+  ReadLog* log_;
+};
+class RecordingMatrix : public Qen_MatrixChannel {
+ public:
+  RecordingMatrix(int link, ReadLog* log) : link_(link), log_(log) {}
+  D3DXMATRIX GetMatrix() override { return log_->push_back(link_), Qen_MatrixChannel::GetMatrix(); }
+
+ private:
+  int link_;
+  ReadLog* log_;
+};
+
+TEST_F(FrameDriver, ReadsEveryLinkAtItsPlaceInTheStageOrder) {
+  ReadLog log;
+  LinkSmoke();
+  Start();
+  for (int link = 1; link <= kLinkSimulationScaler; ++link) {
+    const GUID type = GetEmitterLinkSpec(link).TypeGuid;
+    if (type == kValueGuid) {
+      emitter->ClearChild(link);
+      Link(*emitter, link, Make<RecordingValue>(link, &log));
+    } else if (type == kValueVectorGuid) {
+      Link(*emitter, link, Make<RecordingVector>(link, &log));
+    } else if (type == kMatrixGuid) {
+      Link(*emitter, link, Make<RecordingMatrix>(link, &log));
+    }
+  }
+  emitter->ReadLinks();
+  const std::vector<int> documented = {kLinkAttachedSizeOffsetAdditive,
+                                       kLinkParticleCount,
+                                       kLinkHardwareParticles,
+                                       kLinkBouncingReportCollisions,
+                                       kLinkSlidingAttractorImmunity,
+                                       kLinkAlignToNormals,
+                                       kLinkSizeOffsetMax,
+                                       kLinkSmoke,
+                                       kLinkUseVertexAlphaFading,
+                                       kLinkAttachedSlideRate,
+                                       kLinkAttachedLifespan,
+                                       kLinkAttachedSlidingHeight,
+                                       kLinkSimulationScaler,
+                                       kLinkSpinSpeedMin,
+                                       kLinkSpinSpeedMax,
+                                       kLinkSpinStart,
+                                       kLinkEmitterMotion,
+                                       kLinkCollisionReportRate,
+                                       kLinkOutCollisionId,
+                                       kLinkAttachRate,
+                                       kLinkBounceRate,
+                                       kLinkMaximumSpeed,
+                                       kLinkInitialForceStrength,
+                                       kLinkInitialForceAlongNormal,
+                                       kLinkVertexEmissions,
+                                       kLinkLookAt,
+                                       kLinkLookAtLocal,
+                                       kLinkReplaceOldParticles,
+                                       kLinkLifespanMin,
+                                       kLinkLifespanMax,
+                                       kLinkInitialForceOverride,
+                                       kLinkGlobalForce};
+  EXPECT_EQ(log, documented);
+}
+
+// Once the host context is gone a frame call does nothing, and the public operations stay safe.
+TEST(FrameDriverWithoutHost, DoesNothingOnceTheHostContextIsGone) {
+  auto context = std::make_unique<Qen_HostContext>();
+  std::optional<Qen_HostContext::ScopedCurrent> current(context.get());
+  Tev_AdvancedParticleEmitter emitter;
+  Qen_ValueChannel count(4.0f);
+  ASSERT_TRUE(emitter.SetChild(kLinkParticleCount, &count));
+  emitter.CallChannel();
+  ASSERT_TRUE(emitter.Initialized);
+  current.reset();
+  context.reset();
+  ASSERT_EQ(emitter.GetHostContext(), nullptr);
+  const std::uint32_t lastFrame = emitter.LastFrameCounter;
+  emitter.CallChannel();
+  emitter.CallChannel();
+  EXPECT_EQ(emitter.LastFrameCounter, lastFrame);
+  EXPECT_FALSE(emitter.GetIfParticleActive(0));
+  EXPECT_EQ(emitter.GetParticlePosition(0), D3DXVECTOR3(0.0f, 0.0f, 0.0f));
+  emitter.BirthParticle(0);
+  emitter.ClearChild(kLinkParticleCount);
 }
 
 TEST(RandInt, DrawsOnlyForARangeOfTwoOrMore) {

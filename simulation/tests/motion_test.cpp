@@ -149,4 +149,26 @@ TEST_F(SmokeForces, DragAndFadesScaleWithAge) {
   }
 }
 
+// Switching smoke off leaves no smoke force behind: the particle moves by the global force alone
+// from the next step on, whether the settings go away or "Smoke?" turns off.
+TEST_F(SmokeForces, NoSmokeForceOutlivesSmoke) {
+  const bool unlinkSettings[] = {false, true};
+  Start();
+  for (bool unlink : unlinkSettings) {
+    LinkSmoke();
+    SetSmokeEnvelope(Smoke::kLinkForceStrengthEnvelope, {{0.0f, 1.0f}, {1.0f, 1.0f}});
+    SetSmokeEnvelope(Smoke::kLinkRepulsionEnvelope, {{0.0f, 2.0f}, {4.0f, 2.0f}});
+    SetVector(kLinkGlobalForce, {0.0f, -1.0f, 0.0f});
+    PlaceParticle(0, kZero, kZero);
+    PlaceParticle(1, {1.0f, 0.0f, 0.0f}, kZero);
+    StepOnce();
+    ASSERT_NE(P(0).SmokeForce, kZero) << unlink;
+    unlink ? Unlink(kLinkSmokeSettings) : (void)SetValue(kLinkSmoke, 0.0f);
+    const D3DXVECTOR3 before = P(0).Velocity;
+    StepOnce();
+    EXPECT_EQ(P(0).SmokeForce, kZero) << unlink;
+    EXPECT_EQ(P(0).Velocity, before + D3DXVECTOR3(0.0f, -1.0f, 0.0f)) << unlink;
+  }
+}
+
 }  // namespace

@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <cstdlib>
 #include <limits>
+#include <ostream>
 #include <string>
 #include <vector>
 
@@ -93,6 +94,8 @@ struct BuildCase {
   int MinimumGridParticles;
   sim::PairSearch Search;
   bool Builds;
+  // Failures name the case, not its bytes.
+  friend void PrintTo(const BuildCase& c, std::ostream* os) { *os << c.Name; }
 };
 
 class GridBuild : public SmokeGrid, public ::testing::WithParamInterface<BuildCase> {};

@@ -1,8 +1,12 @@
 #include "tools/render/gif_writer.h"
 
+#include <fcntl.h>
 #include <gif_lib.h>
+#include <unistd.h>
 
 #include <algorithm>
+#include <cerrno>
+#include <cstring>
 #include <vector>
 
 namespace aperender {
@@ -45,9 +49,17 @@ int GifWriter::PaletteIndex(std::uint32_t argb, int x, int y) {
 
 bool GifWriter::Open(const std::string& path, int width, int height, int delay_cs,
                      std::string* error) {
+  // Opened here rather than by giflib, which creates its files readable by their owner only:
+  // the preview follows the user's umask like the other outputs.
+  const int fd = open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0666);
+  if (fd < 0) {
+    *error = "cannot write GIF file \"" + path + "\": " + std::strerror(errno);
+    return false;
+  }
   int code = 0;
-  gif_ = EGifOpenFileName(path.c_str(), false, &code);
+  gif_ = EGifOpenFileHandle(fd, &code);
   if (gif_ == nullptr) {
+    close(fd);
     *error = "cannot write GIF file \"" + path + "\": " + GifErrorText(code);
     return false;
   }
