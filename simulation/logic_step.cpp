@@ -40,6 +40,11 @@ class StepScope {
     PrepareSmokePairs(e);
   }
   ~StepScope() {
+    // A step that ended before its pass over the pool still ages every record in its frame.
+    if (e_.Step.AgeingPending) {
+      e_.Step.AgeingPending = false;
+      for (int i = 0; i < e_.ParticleCount; ++i) e_.Particles[i].Age += e_.Step.AgeSeconds;
+    }
     e_.Step.EnvelopesTaken = false;
     e_.Step.AttractorsTaken = false;
     e_.Step.SmokePairs.Clear();

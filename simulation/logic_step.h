@@ -34,6 +34,10 @@ struct LogicStepState {
   // The non-null channels of "Attractors", in link order; valid while AttractorsTaken.
   std::vector<Tev_AdvPE_Attractor*> Attractors;
   bool AttractorsTaken = false;
+  // The frame's ageing, left by the frame driver to the next logic step: it adds AgeSeconds to
+  // each record's age as it reaches the record, sparing the frame a pass over the pool.
+  bool AgeingPending = false;
+  float AgeSeconds = 0.0f;
   // Smoke pair forces of the step; prepared only while smoke pair envelopes are linked.
   SmokePairGrid SmokePairs;
 };

@@ -1,5 +1,8 @@
 // The per-particle logic update: dispatch, and the live stages L1 to L14 (death, forces, speed
 // limit, size, collision, smoke, move, attractors, facing, spin, colour).
+#include <bit>
+#include <cstdint>
+
 #include "host/attractor.h"
 #include "host/envelope_storage.h"
 #include "host/smoke_settings.h"
@@ -9,6 +12,9 @@
 #include "simulation/vector_math.h"
 
 namespace {
+
+// The stage helpers below are inline into the step's one loop: out of line, their calls were a
+// tenth of a basic update.
 
 // What the live update branches on that holds for a whole logic step (only the link reading
 // stage changes these), read once per step instead of once per particle.
@@ -58,13 +64,13 @@ FadedMotion FadeWithAge(const Tev_AdvancedParticleEmitter& e, const Particle& p)
   return motion;
 }
 
-void LimitSpeed(Particle& p, float maximumSpeed, float s) {
+[[gnu::always_inline]] inline void LimitSpeed(Particle& p, float maximumSpeed, float s) {
   const float limit = maximumSpeed * s;
   if (limit < sim::Length(p.Velocity)) p.Velocity = sim::Unit(p.Velocity) * limit;
 }
 
-void IntegrateVelocity(const Tev_AdvancedParticleEmitter& e, const LiveStepFacts& facts,
-                       Particle& p) {
+[[gnu::always_inline]] inline void IntegrateVelocity(const Tev_AdvancedParticleEmitter& e,
+                                                     const LiveStepFacts& facts, Particle& p) {
   const float s = facts.Scale;
   if (!facts.SmokeFades) {
     p.Velocity += (e.GlobalForce + p.SmokeForce + p.AttractorForce) * s * s;
@@ -76,15 +82,15 @@ void IntegrateVelocity(const Tev_AdvancedParticleEmitter& e, const LiveStepFacts
   if (facts.SpeedLimit) LimitSpeed(p, motion.MaximumSpeed, s);
 }
 
-void Move(Tev_AdvancedParticleEmitter& e, Particle& p) {
+[[gnu::always_inline]] inline void Move(Tev_AdvancedParticleEmitter& e, Particle& p) {
   if (!e.PlacedBySmokeCollision) p.Position += p.Velocity;
   p.RenderPosition = p.Position;
   e.PlacedBySmokeCollision = false;
 }
 
 // Gathered now, applied at the next update's velocity integration.
-void GatherAttractorForce(const Tev_AdvancedParticleEmitter& e, const LiveStepFacts& facts,
-                          Particle& p) {
+[[gnu::always_inline]] inline void GatherAttractorForce(const Tev_AdvancedParticleEmitter& e,
+                                                        const LiveStepFacts& facts, Particle& p) {
   p.AttractorForce = sim::kZeroVector;
   if (p.Sliding && facts.SlidingImmunity) return;
   if (e.Step.AttractorsTaken) {
@@ -102,7 +108,8 @@ void GatherAttractorForce(const Tev_AdvancedParticleEmitter& e, const LiveStepFa
 
 // "LookAt" is a point, or with "LookAt_Local" an offset from the particle; sliding particles
 // aligned to normals face along the surface normal.
-void Face(const Tev_AdvancedParticleEmitter& e, const LiveStepFacts& facts, Particle& p) {
+[[gnu::always_inline]] inline void Face(const Tev_AdvancedParticleEmitter& e,
+                                        const LiveStepFacts& facts, Particle& p) {
   if (p.Attached) return;
   if (facts.AlignToNormals && p.Sliding)
     p.LookAtPoint = p.Position + p.SurfaceNormal;
@@ -113,18 +120,54 @@ void Face(const Tev_AdvancedParticleEmitter& e, const LiveStepFacts& facts, Part
 }
 
 // The angle is handed to sine and cosine unconverted; it is reset (not wrapped) beyond +-360.
-void Spin(const LiveStepFacts& facts, Particle& p) {
+[[gnu::always_inline]] inline void Spin(const LiveStepFacts& facts, Particle& p) {
   if (!facts.Spin) return;
   p.SpinAngle += p.SpinSpeed * facts.Scale;
   if (p.SpinAngle > 360.0f || p.SpinAngle < -360.0f) p.SpinAngle = 0.0f;
   p.RenderSpinAngle = p.SpinAngle;
 }
 
+// The size and colour a record's earlier update in this step sampled. They depend only on the
+// normalised age (and the size multiplier), which stays the same through a newborn's catch-up
+// updates (ageing is per frame): those take them from here instead of sampling again.
+struct SampledLook {
+  bool HasSize = false;
+  std::uint32_t SizeAge = 0;  // bits of the normalised age and of the multiplier sampled
+  std::uint32_t SizeMultiplier = 0;
+  float Size = 0.0f;
+  bool HasColor = false;
+  std::uint32_t ColorAge = 0;
+  std::uint32_t Color = 0;
+};
+
+[[gnu::always_inline]] inline float SizeOf(const sim::MainEnvelopeViews& views, const Particle& p,
+                                           SampledLook& look) {
+  const auto age = std::bit_cast<std::uint32_t>(p.NormalizedAge);
+  const auto multiplier = std::bit_cast<std::uint32_t>(p.SizeMultiplier);
+  if (look.HasSize && look.SizeAge == age && look.SizeMultiplier == multiplier) return look.Size;
+  look.HasSize = true;
+  look.SizeAge = age;
+  look.SizeMultiplier = multiplier;
+  look.Size = sim::LiveSize(views, p);
+  return look.Size;
+}
+
+[[gnu::always_inline]] inline std::uint32_t ColorOf(const sim::MainEnvelopeViews& views,
+                                                    const Particle& p, SampledLook& look) {
+  const auto age = std::bit_cast<std::uint32_t>(p.NormalizedAge);
+  if (look.HasColor && look.ColorAge == age) return look.Color;
+  look.HasColor = true;
+  look.ColorAge = age;
+  look.Color = sim::LiveColor(views, p.NormalizedAge);
+  return look.Color;
+}
+
 // The whole update of one live particle. Inline into the step's loop, with the step's facts and
 // envelope views held there.
 [[gnu::always_inline]] inline void UpdateLive(Tev_AdvancedParticleEmitter& e, int index,
                                               const LiveStepFacts& facts,
-                                              const sim::MainEnvelopeViews& views) {
+                                              const sim::MainEnvelopeViews& views,
+                                              SampledLook& look) {
   Particle& p = e.Particles[index];
   e.VerticesDirty = true;
   if (p.Age > p.Lifespan) {
@@ -139,7 +182,7 @@ void Spin(const LiveStepFacts& facts, Particle& p) {
   if (p.Sliding)
     e.ApplySizeEnvelope(p);
   else
-    p.Size = sim::LiveSize(views, p);
+    p.Size = SizeOf(views, p, look);
   // The collision may kill, attach or redirect the particle; the stages below run on regardless.
   if (facts.Collision) e.CollisionStage(p);
   if (facts.Smoke) e.SmokeStage(index);
@@ -147,38 +190,59 @@ void Spin(const LiveStepFacts& facts, Particle& p) {
   GatherAttractorForce(e, facts, p);
   Face(e, facts, p);
   Spin(facts, p);
-  if (facts.Colours) p.Color = sim::LiveColor(views, p.NormalizedAge);
+  if (facts.Colours) p.Color = ColorOf(views, p, look);
 }
 
 [[gnu::always_inline]] inline void Update(Tev_AdvancedParticleEmitter& e, int index,
                                           const LiveStepFacts& facts,
-                                          const sim::MainEnvelopeViews& views) {
+                                          const sim::MainEnvelopeViews& views, SampledLook& look) {
   Particle& p = e.Particles[index];
   if (p.Attached && p.Active)
     e.UpdateAttachedParticle(p);
   else if (p.Active)
-    UpdateLive(e, index, facts, views);
+    UpdateLive(e, index, facts, views, look);
+}
+
+// Every record's pending updates in index order, each record first aged when the frame's ageing
+// is left to this step.
+template <bool kAgeing>
+void UpdateAll(Tev_AdvancedParticleEmitter& e, float ageSeconds) {
+  const LiveStepFacts facts = FactsOf(e);
+  const sim::MainEnvelopeViews views = e.Step.Envelopes;
+  int i = 0;
+  try {
+    for (; i < e.ParticleCount; ++i) {
+      if (kAgeing) e.Particles[i].Age += ageSeconds;
+      const std::int32_t steps = e.Particles[i].PendingSteps;
+      SampledLook look;
+      for (std::int32_t k = 0; k < steps; ++k) Update(e, i, facts, views, look);
+      e.Particles[i].PendingSteps = 1;
+    }
+  } catch (...) {
+    // Every record still ages in its frame.
+    if (kAgeing)
+      for (++i; i < e.ParticleCount; ++i) e.Particles[i].Age += ageSeconds;
+    throw;
+  }
 }
 
 }  // namespace
 
 void Tev_AdvancedParticleEmitter::UpdateParticles() {
-  const LiveStepFacts facts = FactsOf(*this);
-  const sim::MainEnvelopeViews views = Step.Envelopes;
-  for (int i = 0; i < ParticleCount; ++i) {
-    const std::int32_t steps = Particles[i].PendingSteps;
-    for (std::int32_t k = 0; k < steps; ++k) Update(*this, i, facts, views);
-    Particles[i].PendingSteps = 1;
-  }
+  if (!Step.AgeingPending) return UpdateAll<false>(*this, 0.0f);
+  Step.AgeingPending = false;
+  UpdateAll<true>(*this, Step.AgeSeconds);
 }
 
 void Tev_AdvancedParticleEmitter::UpdateParticle(int index) {
   // Outside a logic step the update samples the envelopes linked now.
   if (!Step.EnvelopesTaken) Step.Envelopes = sim::TakeMainEnvelopeViews(*this);
-  Update(*this, index, FactsOf(*this), Step.Envelopes);
+  SampledLook look;
+  Update(*this, index, FactsOf(*this), Step.Envelopes, look);
 }
 
 void Tev_AdvancedParticleEmitter::UpdateLiveParticle(int index) {
   if (!Step.EnvelopesTaken) Step.Envelopes = sim::TakeMainEnvelopeViews(*this);
-  UpdateLive(*this, index, FactsOf(*this), Step.Envelopes);
+  SampledLook look;
+  UpdateLive(*this, index, FactsOf(*this), Step.Envelopes, look);
 }
