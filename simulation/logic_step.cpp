@@ -9,8 +9,8 @@
 
 namespace {
 
-// The attractor list as every update of the step would enumerate it; left to the updates when
-// the link reading stage could not reserve room for it (the step allocates nothing).
+// The attractors' fields as every update of the step would read them; left to the updates when
+// the link reading stage could not reserve room for them (the step allocates nothing).
 void TakeAttractors(Tev_AdvancedParticleEmitter& e) {
   sim::LogicStepState& step = e.Step;
   step.Attractors.clear();
@@ -20,7 +20,7 @@ void TakeAttractors(Tev_AdvancedParticleEmitter& e) {
   for (int a = 0; a < count; ++a) {
     auto* attractor =
         static_cast<Tev_AdvPE_Attractor*>(e.GetChildFromLinkPosition(kLinkAttractors, a));
-    if (attractor) step.Attractors.push_back(attractor);
+    if (attractor) step.Attractors.push_back(attractor->TakeField());
   }
 }
 

@@ -94,8 +94,8 @@ FadedMotion FadeWithAge(const Tev_AdvancedParticleEmitter& e, const Particle& p)
   p.AttractorForce = sim::kZeroVector;
   if (p.Sliding && facts.SlidingImmunity) return;
   if (e.Step.AttractorsTaken) {
-    for (Tev_AdvPE_Attractor* attractor : e.Step.Attractors)
-      p.AttractorForce += attractor->GetForceAtPosition(p.RenderPosition);
+    for (const Tev_AdvPE_Attractor::Field& field : e.Step.Attractors)
+      p.AttractorForce += Tev_AdvPE_Attractor::ForceAt(field, p.RenderPosition);
     return;
   }
   const int count = e.GetChildLinkPositionCount(kLinkAttractors);
@@ -162,12 +162,25 @@ struct SampledLook {
   return look.Color;
 }
 
+// A record's only update in the step: nothing to reuse.
+struct NoLook {};
+
+[[gnu::always_inline]] inline float SizeOf(const sim::MainEnvelopeViews& views, const Particle& p,
+                                           NoLook&) {
+  return sim::LiveSize(views, p);
+}
+
+[[gnu::always_inline]] inline std::uint32_t ColorOf(const sim::MainEnvelopeViews& views,
+                                                    const Particle& p, NoLook&) {
+  return sim::LiveColor(views, p.NormalizedAge);
+}
+
 // The whole update of one live particle. Inline into the step's loop, with the step's facts and
 // envelope views held there.
+template <typename Look>
 [[gnu::always_inline]] inline void UpdateLive(Tev_AdvancedParticleEmitter& e, int index,
                                               const LiveStepFacts& facts,
-                                              const sim::MainEnvelopeViews& views,
-                                              SampledLook& look) {
+                                              const sim::MainEnvelopeViews& views, Look& look) {
   Particle& p = e.Particles[index];
   e.VerticesDirty = true;
   if (p.Age > p.Lifespan) {
@@ -193,9 +206,10 @@ struct SampledLook {
   if (facts.Colours) p.Color = ColorOf(views, p, look);
 }
 
+template <typename Look>
 [[gnu::always_inline]] inline void Update(Tev_AdvancedParticleEmitter& e, int index,
                                           const LiveStepFacts& facts,
-                                          const sim::MainEnvelopeViews& views, SampledLook& look) {
+                                          const sim::MainEnvelopeViews& views, Look& look) {
   Particle& p = e.Particles[index];
   if (p.Attached && p.Active)
     e.UpdateAttachedParticle(p);
@@ -214,8 +228,13 @@ void UpdateAll(Tev_AdvancedParticleEmitter& e, float ageSeconds) {
     for (; i < e.ParticleCount; ++i) {
       if (kAgeing) e.Particles[i].Age += ageSeconds;
       const std::int32_t steps = e.Particles[i].PendingSteps;
-      SampledLook look;
-      for (std::int32_t k = 0; k < steps; ++k) Update(e, i, facts, views, look);
+      if (steps == 1) {
+        NoLook none;
+        Update(e, i, facts, views, none);
+      } else {
+        SampledLook look;
+        for (std::int32_t k = 0; k < steps; ++k) Update(e, i, facts, views, look);
+      }
       e.Particles[i].PendingSteps = 1;
     }
   } catch (...) {
@@ -237,12 +256,12 @@ void Tev_AdvancedParticleEmitter::UpdateParticles() {
 void Tev_AdvancedParticleEmitter::UpdateParticle(int index) {
   // Outside a logic step the update samples the envelopes linked now.
   if (!Step.EnvelopesTaken) Step.Envelopes = sim::TakeMainEnvelopeViews(*this);
-  SampledLook look;
-  Update(*this, index, FactsOf(*this), Step.Envelopes, look);
+  NoLook none;
+  Update(*this, index, FactsOf(*this), Step.Envelopes, none);
 }
 
 void Tev_AdvancedParticleEmitter::UpdateLiveParticle(int index) {
   if (!Step.EnvelopesTaken) Step.Envelopes = sim::TakeMainEnvelopeViews(*this);
-  SampledLook look;
-  UpdateLive(*this, index, FactsOf(*this), Step.Envelopes, look);
+  NoLook none;
+  UpdateLive(*this, index, FactsOf(*this), Step.Envelopes, none);
 }
