@@ -24,8 +24,9 @@ double LinearSlope(const Tev_EnvelopeStorage::Key& from, const Tev_EnvelopeStora
 // A span as a segment: the value at x is Y + (x - X) * Slope, kept between the two y values.
 EnvelopeSegment SpanSegment(const Tev_EnvelopeStorage::Key& from,
                             const Tev_EnvelopeStorage::Key& to) {
-  const bool step = from.Mode == Tev_EnvelopeStorage::Interpolation::Step;
-  return {from.X, from.Y, step ? 0.0 : LinearSlope(from, to), std::min(from.Y, to.Y),
+  // A span between keys of equal x is never sampled (the later key decides there): no slope.
+  const bool flat = from.Mode == Tev_EnvelopeStorage::Interpolation::Step || !(to.X > from.X);
+  return {from.X, from.Y, flat ? 0.0 : LinearSlope(from, to), std::min(from.Y, to.Y),
           std::max(from.Y, to.Y)};
 }
 
