@@ -101,5 +101,63 @@ TEST_F(ApeRenderTest, GlDeviceWritesFramesSheetPreviewAndStats) {
   EXPECT_NE(run.Out.find("Written to " + Out() + ": 3 frames"), std::string::npos) << run.Out;
 }
 
+TEST_F(ApeRenderTest, AtRendersTheOneFrameShowingThatMoment) {
+  const RunResult run = Render("--at 0.1 --fps 30 --size 64x36 --quiet --device gl",
+                               "MESA_SHADER_CACHE_DISABLE=true");
+  if (run.Status == 1 && run.Err.find("no device") != std::string::npos)
+    GTEST_SKIP() << "no OpenGL context: " << run.Err;
+  ASSERT_EQ(run.Status, 0) << run.Err;
+  // 0.1 s at 30 fps is frame 3; the frames before it run but are not written.
+  EXPECT_TRUE(std::filesystem::exists(Out() + "/frame_0003.png"));
+  for (const char* name : {"frame_0001.png", "frame_0002.png", "contact_sheet.png", "preview.gif"})
+    EXPECT_FALSE(std::filesystem::exists(Out() + "/" + name)) << name;
+  const std::string stats = ReadFile(Out() + "/stats.csv");
+  EXPECT_EQ(std::count(stats.begin(), stats.end(), '\n'), 4);
+  EXPECT_NE(run.Out.find("Written to " + Out() + ": frame_0003.png and stats.csv."),
+            std::string::npos)
+      << run.Out;
+}
+
+TEST_F(ApeRenderTest, CheckPrintsWarningsOnlyAndExitsZero) {
+  const std::string scene = Scene(
+      "{\"channels\": {\"fx\": {\"type\": \"AdvancedParticleEmitter\", \"links\": {\n"
+      "  \"Emitter_Active?\": 1, \"Births Per Second\": 10, \"Logic Updates Per Second\": 60,\n"
+      "  \"ParticleCount\": 10, \"Lifespan_Min\": 3, \"Lifespan_Max\": 1,\n"
+      "  \"Emitter\": {\"shape\": \"disc\"}, \"LookAt\": \"camera.eye\",\n"
+      "  \"Size Envelope\": [[0, 0.1]], \"Red Color Envelope\": [[0, 255]]}}}}");
+  const RunResult run = Render(scene + " --check");
+  EXPECT_EQ(run.Status, 0) << run.Err;
+  EXPECT_EQ(run.Out, scene +
+                         ":3: channels.fx.links.Lifespan_Min: warning: 3 s is above "
+                         "\"Lifespan_Max\" (1 s): every particle lives Lifespan_Min and the "
+                         "maximum is ignored\n" +
+                         scene + ": 1 warning\n");
+  EXPECT_FALSE(std::filesystem::exists(Out()));  // nothing rendered
+  // Rendering prints the same warning on stderr.
+  const RunResult rendered = Render(scene + " --device null --frames 1");
+  ASSERT_EQ(rendered.Status, 0) << rendered.Err;
+  EXPECT_NE(
+      rendered.Err.find("ape-render: " + scene + ":3: channels.fx.links.Lifespan_Min: warning:"),
+      std::string::npos)
+      << rendered.Err;
+  // A scene that does not load: its error, status 2.
+  EXPECT_EQ(Render(Scene(R"({"fps": "fast"})") + " --check").Status, 2);
+}
+
+TEST_F(ApeRenderTest, ListLinksPrintsTheReference) {
+  const RunResult one = Render("--list-links AdvPE_SmokeSettings");
+  ASSERT_EQ(one.Status, 0) << one.Err;
+  EXPECT_EQ(one.Out.rfind("AdvPE_SmokeSettings: 14 links, by group\n", 0), 0u) << one.Out;
+  EXPECT_NE(one.Out.find("  3 \"Force Strength Envelope\" (EnvelopeStorage)"), std::string::npos);
+  const RunResult all = Render("--list-links");
+  ASSERT_EQ(all.Status, 0) << all.Err;
+  for (const char* type : {"AdvancedParticleEmitter: 54 links", "MultiCollisionManager: 1 link",
+                           "AdvPE_Attractor: 7 links", "AdvPE_SmokeSettings: 14 links"})
+    EXPECT_NE(all.Out.find(type), std::string::npos) << type;
+  const RunResult unknown = Render("--list-links Sparks");
+  EXPECT_EQ(unknown.Status, 2);
+  EXPECT_NE(unknown.Err.find("known: AdvancedParticleEmitter"), std::string::npos) << unknown.Err;
+}
+
 }  // namespace
 }  // namespace scenetest

@@ -1,5 +1,6 @@
 // The pieces of a render: choosing contact-sheet frames, progress texts, the statistics table,
-// the output folder and the particle census. (The sheet's layout is in the golden pictures.)
+// the output folder and the particle census's loop replay. (The sheet's layout is in the golden
+// pictures.)
 #include <gif_lib.h>
 #include <gtest/gtest.h>
 
@@ -14,6 +15,7 @@
 #include "tools/render/progress.h"
 #include "tools/render/render_output.h"
 #include "tools/render/stats_table.h"
+#include "tools/render/tile_label.h"
 #include "tools/scene/png_io.h"
 
 namespace scenetest {
@@ -63,10 +65,10 @@ TEST(StatsTableTest, OneRowPerFrameAndTotals) {
   stats.Add(Frame(1, 10, 10, 3.0, 1.0));
   stats.Add(Frame(2, 25, 15, 5.0, 0.5));
   EXPECT_EQ(stats.Csv(),
-            "frame,seconds,live,attached,sliding,births,logic_steps,channel_ms,draw_ms,"
+            "frame,seconds,live,attached,sliding,births,deaths,logic_steps,channel_ms,draw_ms,"
             "simulation_and_vertex_ms,readback_ms\n"
-            "1,0.0333,10,0,0,10,2,3.000,1.000,2.000,1.000\n"
-            "2,0.0667,25,0,0,15,2,5.000,0.500,4.500,1.000\n");
+            "1,0.0333,10,0,0,10,0,2,3.000,1.000,2.000,1.000\n"
+            "2,0.0667,25,0,0,15,0,2,5.000,0.500,4.500,1.000\n");
   const aperender::StatsTable::Totals t = stats.Summarise();
   EXPECT_EQ(std::make_tuple(t.Frames, t.PeakLive, t.Births, t.LogicSteps),
             std::make_tuple(2, 25, 25, 4));
@@ -113,46 +115,39 @@ TEST(RenderOutputTest, PicturesMakeFramesSheetAndPreviewAndStaleFramesGo) {
   EXPECT_EQ(permissions("preview.gif"), permissions("stats.csv"));
 }
 
-class ParticleCensusTest : public ::testing::Test {
- protected:
-  ParticleCensusTest() { emitter_.Particles.resize(4); }
-  Qen_HostContext context_;
-  Qen_HostContext::ScopedCurrent current_{&context_};
-  Tev_AdvancedParticleEmitter emitter_;
-  aperender::ParticleCensus census_;
-};
-
-TEST_F(ParticleCensusTest, CountsBirthsFromThePool) {
-  std::vector<Particle>& p = emitter_.Particles;
-  p[1].Active = true, p[1].Age = 0.5f;  // lives on
-  p[2].Active = true, p[2].Age = 0.9f;  // will be replaced by a new particle
-  p[3].Active = true, p[3].Age = 0.7f;  // will attach, which restarts its age
-  census_.Before(emitter_);
-  p[0].Active = true, p[0].Age = 0.01f;  // born
-  p[1].Age = 0.53f;
-  p[2].Age = 0.02f;
-  p[3].Attached = true, p[3].Age = 0.0f;
-  const aperender::ParticleCounts counts = census_.After(emitter_, 33.3);
-  EXPECT_EQ(std::make_tuple(counts.Live, counts.Attached, counts.Births), std::make_tuple(4, 1, 2));
-  // A pool rebuilt in between (another size) counts no births.
-  census_.Before(emitter_);
-  emitter_.Particles.assign(6, Particle{});
-  emitter_.Particles[0].Active = true;
-  EXPECT_EQ(census_.After(emitter_, 10.0).Births, 0);
+TEST(TileLabelTest, CaptionInWhiteOnADarkBoxClippedToThePicture) {
+  EXPECT_EQ(aperender::TileCaption(12, 0.4), "frame 12  0.40 s");
+  Image picture = Filled(100, 40, 0xFF808080u);
+  aperender::DrawCaption(&picture, "1", 2);
+  auto at = [&](int x, int y) { return picture.Argb[static_cast<std::size_t>(y * 100 + x)]; };
+  // The margin is 2 font pixels (4 here); "1" has ink in its middle column on every row.
+  EXPECT_EQ(at(0, 0), 0xFF000000u);
+  EXPECT_EQ(at(4 + 2 * 2, 4), 0xFFFFFFFFu);
+  EXPECT_EQ(at(4, 4), 0xFF000000u);                  // no ink at the top-left of "1"
+  EXPECT_EQ(at(4 + 2 * 2, 4 + 6 * 2), 0xFFFFFFFFu);  // its foot
+  EXPECT_EQ(at(30, 30), 0xFF808080u);                // beyond the box
+  Image tiny = Filled(3, 2, 0xFF808080u);
+  aperender::DrawCaption(&tiny, "frame 1", 2);  // clipped, not written out of bounds
+  EXPECT_EQ(tiny.Argb.size(), 6u);
 }
 
-TEST_F(ParticleCensusTest, LogicStepsFromTheBankedTime) {
-  emitter_.LogicInterval = 20.0f;
-  emitter_.LogicAccumulator = 5.0f;
-  census_.Before(emitter_);
-  emitter_.LogicAccumulator = 15.0f;  // 5 + 50 = 55 ms: two steps of 20, 15 left
-  EXPECT_EQ(census_.After(emitter_, 50.0).LogicSteps, 2);
-  emitter_.Paused = true;  // a paused frame banks nothing
-  emitter_.LogicAccumulator = 5.0f;
-  EXPECT_EQ(census_.After(emitter_, 50.0).LogicSteps, 0);
-  emitter_.Paused = false;
-  emitter_.LogicInterval = 0.0f;  // no rate: no steps, and no division by zero
-  EXPECT_EQ(census_.After(emitter_, 50.0).LogicSteps, 0);
+TEST(ParticleCensusTest, BankLoopGoesRoundAsTheFrameDriverDoes) {
+  struct Case {
+    float Bank, Interval;
+    int Rounds;
+    float Left;
+  };
+  const Case cases[] = {
+      {55.0f, 20.0f, 2, 15.0f},       // two intervals, 15 ms kept
+      {40.0f, 10.0f, 3, 10.0f},       // strictly more than an interval: 10 stays banked
+      {0.0f, 10.0f, 0, 0.0f},         // nothing banked
+      {500000.0f, 0.1f, 1001, 0.0f},  // the cap: one round past it, and the bank dropped
+  };
+  for (const Case& c : cases) {
+    float left = -1.0f;
+    EXPECT_EQ(aperender::CountBankLoop(c.Bank, c.Interval, 1000, &left), c.Rounds) << c.Bank;
+    EXPECT_EQ(left, c.Left) << c.Bank;
+  }
 }
 
 }  // namespace

@@ -46,21 +46,24 @@ INSTANTIATE_TEST_SUITE_P(
         ErrorCase{"UnknownLinkSuggestsTheNearOne",
                   WithEmitterLinks("{\n\"Births per second\": 10}"),
                   "test.json:2: channels.fx.links.\"Births per second\": unknown link name for "
-                  "AdvancedParticleEmitter (did you mean \"Births Per Second\"?)"},
+                  "AdvancedParticleEmitter (did you mean \"Births Per Second\"?); ape-render "
+                  "--list-links AdvancedParticleEmitter lists them all"},
         ErrorCase{"LinkIndexOutOfRange", WithEmitterLinks(R"({"54": 1})"),
                   "test.json:1: channels.fx.links.54: no link at index 54 "
                   "(AdvancedParticleEmitter has links 0 to 53)"},
         ErrorCase{"UnknownChannelName",
                   WithEmitterLinks(R"({"Emitter": "nozle"})",
                                    R"("nozzle": {"type": "3D ObjectData", "shape": "disc"})"),
-                  "test.json:1: channels.fx.links.Emitter: no channel is named \"nozle\""},
+                  "test.json:1: channels.fx.links.Emitter: no channel is named \"nozle\" (did you "
+                  "mean \"nozzle\"?)"},
         ErrorCase{"ChannelOfTheWrongType",
                   WithEmitterLinks(R"({"Emitter": "tex"})",
                                    R"("tex": {"type": "Texture", "image": "dot", "size": 4})"),
                   "test.json:1: channels.fx.links.Emitter: channel \"tex\" (Texture) cannot be "
                   "linked here: the link takes 3D ObjectData channels"},
         ErrorCase{"UnknownChannelType", WithChannel(R"({"type": "Emiter"})"),
-                  "test.json:1: channels.thing.type: unknown channel type \"Emiter\" (known: "
+                  "test.json:1: channels.thing.type: unknown channel type \"Emiter\"; did you mean "
+                  "\"AdvancedParticleEmitter\"? (known: "
                   "Value, Value Vector, Matrix, Texture, DX8 Device, AdvancedParticleEmitter, "
                   "3D ObjectData, EnvelopeStorage, MultiCollisionManager, AdvPE_Attractor, "
                   "AdvPE_SmokeSettings)"},

@@ -7,7 +7,9 @@
 #include <unistd.h>
 #include <CLI/CLI.hpp>
 
+#include <algorithm>
 #include <chrono>
+#include <cmath>
 #include <cstdio>
 #include <filesystem>
 #include <map>
@@ -26,6 +28,8 @@
 #include "tools/render/render_output.h"
 #include "tools/render/scene_renderer.h"
 #include "tools/render/summary.h"
+#include "tools/scene/link_reference.h"
+#include "tools/scene/link_reference_text.h"
 #include "tools/scene/scene_loader.h"
 
 namespace {
@@ -42,6 +46,9 @@ struct Options {
   std::string device = "gl";
   std::optional<unsigned> seed;
   bool quiet = false;
+  bool check = false;                     // load and check only
+  std::optional<std::string> list_links;  // a channel type, or empty for every type
+  std::optional<double> at;               // seconds: render only the frame shown then
 };
 
 int Fail(int status, const std::string& message) {
@@ -64,6 +71,34 @@ std::string DefaultOutFolder(const std::string& scene) {
   return "out/" + std::filesystem::path(scene).stem().string();
 }
 
+int ListLinks(const std::string& type) {
+  std::string text;
+  for (std::string_view known : apescene::KnownChannelTypes())
+    if (type.empty() || type == known)
+      text += (text.empty() ? "" : "\n") + apescene::LinkListing(known);
+  if (text.empty()) {
+    std::string known;
+    for (std::string_view name : apescene::KnownChannelTypes())
+      known += (known.empty() ? "" : ", ") + std::string(name);
+    return Fail(kExitBadInput,
+                "--list-links: no links known for \"" + type + "\" (known: " + known + ")");
+  }
+  std::fputs(text.c_str(), stdout);
+  return 0;
+}
+
+// --check: the warnings on stdout, one a line, then how many.
+int ReportCheck(const apescene::Scene& scene) {
+  for (const apescene::SceneWarning& warning : scene.Warnings)
+    std::printf("%s\n", apescene::FormatWarning(scene.SourceName, warning).c_str());
+  const std::size_t count = scene.Warnings.size();
+  std::printf("%s: %s\n", scene.SourceName.c_str(),
+              count == 0
+                  ? "no warnings"
+                  : (std::to_string(count) + (count == 1 ? " warning" : " warnings")).c_str());
+  return 0;
+}
+
 int Render(const Options& options) {
   // The scene's settings first, so that the device is made at the right size.
   apescene::SceneSource source;
@@ -79,6 +114,9 @@ int Render(const Options& options) {
   if (options.frames) settings.Frames = *options.frames;
   if (options.fps) settings.Fps = *options.fps;
   if (options.seed) settings.Seed = *options.seed;
+  // The frame that shows the moment asked for; the frames before it run all the same.
+  if (options.at)
+    settings.Frames = std::max(1, static_cast<int>(std::lround(*options.at * settings.Fps)));
   if (!options.size.empty() && !ParseSize(options.size, &settings.Width, &settings.Height))
     return Fail(kExitBadInput,
                 "--size: expected WIDTHxHEIGHT (1 to 8192 each), got \"" + options.size + "\"");
@@ -99,8 +137,9 @@ int Render(const Options& options) {
   context.OverloadMessages.SetSink(collect);
   TestClock clock;
 
+  const std::string device_kind = options.check ? "null" : options.device;
   std::unique_ptr<aperender::RenderDevice> device =
-      aperender::RenderDevice::Create(options.device, settings.Width, settings.Height, &error);
+      aperender::RenderDevice::Create(device_kind, settings.Width, settings.Height, &error);
   if (device == nullptr)
     return Fail(
         kExitFailure,
@@ -111,10 +150,16 @@ int Render(const Options& options) {
   PluginLoader loader;
   std::unique_ptr<apescene::Scene> scene = apescene::LoadScene(source, loader, &error);
   if (scene == nullptr) return Fail(kExitBadInput, error);
+  if (options.check) return ReportCheck(*scene);
+  if (!options.quiet)
+    for (const apescene::SceneWarning& warning : scene->Warnings)
+      std::fprintf(stderr, "ape-render: %s\n",
+                   apescene::FormatWarning(scene->SourceName, warning).c_str());
 
   aperender::RenderOutput output;
   const std::string folder = options.out.empty() ? DefaultOutFolder(options.scene) : options.out;
-  if (!output.Open(folder, frames, settings.Fps, options.device == "gl", &error))
+  if (!output.Open(folder, frames, settings.Fps, options.device == "gl", &error,
+                   options.at ? frames : 0))
     return Fail(kExitFailure, error);
 
   aperender::SceneRenderer renderer(*scene, *device, context, clock, settings.Width,
@@ -144,6 +189,7 @@ int Render(const Options& options) {
   facts.Messages = message_count;
   facts.Folder = folder;
   facts.FramesWritten = output.FramesWritten();
+  if (options.at) facts.OnlyFrameFile = aperender::RenderOutput::FrameFileName(frames, frames);
   std::printf("%s\n", aperender::RenderSummary(facts, output.Stats().Summarise()).c_str());
   scene.reset();  // its channels go before the loader unloads their libraries
   return 0;
@@ -163,7 +209,7 @@ int main(int argc, char** argv) {
       "--device null uses the reference device, which draws nothing: no frames, contact sheet "
       "or preview are written, only stats.csv and the summary.\n"
       "Exit status: 0 done, 1 device or output failure, 2 bad command line or scene file.\n"
-      "Scene format: docs/scene-format.md");
+      "Scene format: docs/scene-format.md; every link: docs/links.md or --list-links.");
   app.add_option("SCENE", options.scene, "scene file (JSON)");
   app.add_option("--frames", options.frames, "number of frames (default: the scene's)")
       ->check(CLI::Range(1, 1'000'000));
@@ -173,7 +219,21 @@ int main(int argc, char** argv) {
   app.add_option("--out", options.out, "output folder (default: out/<scene name>)");
   app.add_option("--device", options.device, "gl or null")->check(CLI::IsMember({"gl", "null"}));
   app.add_option("--seed", options.seed, "seed for rand (default: the scene's)");
-  app.add_flag("--quiet", options.quiet, "no progress and no emitter messages on stderr");
+  app.add_flag("--quiet", options.quiet,
+               "no progress, no scene warnings and no emitter messages on stderr");
+  app.add_flag("--check", options.check,
+               "only load SCENE and print its warnings (likely mistakes), one a line: exit 0 "
+               "with or without warnings, 2 when the scene does not load");
+  app.add_option("--list-links", options.list_links,
+                 "print every link of a channel type (AdvancedParticleEmitter, "
+                 "MultiCollisionManager, AdvPE_Attractor, AdvPE_SmokeSettings; all without "
+                 "TYPE): index, type, unit, default and meaning")
+      ->expected(0, 1)
+      ->type_name("[TYPE]");
+  app.add_option("--at", options.at,
+                 "render only the frame that shows this moment (frame_NNNN.png and stats.csv; "
+                 "the frames before it are simulated)")
+      ->check(CLI::Range(0.0, 3600.0));
   try {
     app.parse(argc, argv);
   } catch (const CLI::Success& e) {
@@ -183,6 +243,7 @@ int main(int argc, char** argv) {
     return kExitBadInput;
   }
   try {
+    if (options.list_links) return ListLinks(*options.list_links);
     return Render(options);
   } catch (const std::exception& e) {
     return Fail(kExitFailure, e.what());

@@ -1,12 +1,23 @@
-// Counts of an emitter's particles, taken from its pool before and after a frame. The emitter
-// does not count its own births or logic steps, so they are worked out here:
-//  - births: slots that hold a new particle after the frame (free before, or restarted while not
-//    newly attached); a particle born and dead within one frame is not seen;
-//  - logic steps: the banked logic time spent this frame divided by the logic interval.
+// Counts of an emitter's particles in a frame: how many live after it, and how many were born,
+// how many ended and how many logic steps ran in it, all exact.
+//
+// The emitter keeps no counts of its own, and the tools do not change it, so the census works
+// them out from what the emitter exposes before and after its frame:
+//  - births: the frame driver's birth loop is replayed on the emitter's own float values (the
+//    banked birth time before the frame, the elapsed time its performance counter measured, the
+//    birth interval and the "Emitter_Active?" gate), which gives the births it asked for; of
+//    those, the ones that found a record and a point happened: all, or with a full pool and no
+//    "ReplaceOldParticles?", as many as there were free records before the frame (deaths come
+//    only after the births). A replay that does not end on the emitter's own banked time falls
+//    back to the free records that were taken.
+//  - deaths (particles that ended: their life or attached life ran out, a collision killed
+//    them, a birth replaced them or the pool was rebuilt): the live count before, plus the
+//    births, minus the live count after. A particle born and killed within one frame is
+//    counted both times.
+//  - logic steps: the logic loop replayed the same way.
 #pragma once
 
 #include <cstdint>
-#include <vector>
 
 class Tev_AdvancedParticleEmitter;
 
@@ -17,24 +28,30 @@ struct ParticleCounts {
   int Attached = 0;
   int Sliding = 0;
   int Births = 0;
+  int Deaths = 0;
   int LogicSteps = 0;
 };
 
 class ParticleCensus {
  public:
-  // Remembers the pool and the logic bank before the frame.
+  // Remembers what the frame starts from.
   void Before(const Tev_AdvancedParticleEmitter& emitter);
-  // Counts after a frame of `frame_ms` of (unscaled) time.
-  ParticleCounts After(const Tev_AdvancedParticleEmitter& emitter, double frame_ms) const;
+  // The counts after the frame.
+  ParticleCounts After(const Tev_AdvancedParticleEmitter& emitter) const;
 
  private:
-  struct Slot {
-    bool Active;
-    bool Attached;
-    float Age;
-  };
-  std::vector<Slot> slots_;
-  float logic_accumulator_ms_ = 0.0f;
+  bool initialized_ = false;  // false: the frame only (re)builds the emitter
+  int live_ = 0;
+  int free_ = 0;
+  bool any_free_flying_ = false;  // a live record a replacing birth may take
+  float birth_bank_ms_ = 0.0f;
+  float logic_bank_ms_ = 0.0f;
+  std::int64_t counter_ = 0;
 };
+
+// How many times the frame driver's loop `while (bank > interval) { bank -= interval; ...;
+// if (++n > cap) { bank = 0; break; } }` goes round, in float as the driver computes it; the
+// bank it leaves in *left.
+int CountBankLoop(float bank_ms, float interval_ms, int cap, float* left);
 
 }  // namespace aperender

@@ -6,6 +6,7 @@
 #include <regex>
 
 #include "tools/render/contact_sheet.h"
+#include "tools/render/tile_label.h"
 #include "tools/scene/png_io.h"
 
 namespace aperender {
@@ -23,8 +24,9 @@ std::string RenderOutput::Path(const std::string& name) const {
 }
 
 bool RenderOutput::Open(const std::string& folder, int frames, double fps, bool pictures,
-                        std::string* error) {
+                        std::string* error, int only_frame) {
   folder_ = folder;
+  only_frame_ = only_frame;
   frames_ = frames;
   fps_ = fps;
   pictures_ = pictures;
@@ -51,16 +53,22 @@ bool RenderOutput::Open(const std::string& folder, int frames, double fps, bool 
 bool RenderOutput::AddFrame(const FrameResult& frame, std::string* error) {
   stats_.Add(frame);
   if (!pictures_ || !frame.HasPicture) return true;
+  if (only_frame_ > 0 && frame.Frame != only_frame_) return true;
   if (!apescene::WritePng(Path(FrameFileName(frame.Frame, frames_)), frame.Picture, false, error))
     return false;
   ++frames_written_;
+  if (only_frame_ > 0) return true;
 
   const bool in_sheet =
       std::find(sheet_frames_.begin(), sheet_frames_.end(), frame.Frame) != sheet_frames_.end();
   const bool in_preview = (frame.Frame - 1) % preview_step_ == 0;
   if (!in_sheet && !in_preview) return true;
   const apescene::Image small = apescene::ShrinkToWidth(frame.Picture, kPreviewWidth);
-  if (in_sheet) sheet_pictures_.push_back(small);
+  if (in_sheet) {
+    apescene::Image tile = small;
+    DrawCaption(&tile, TileCaption(frame.Frame, frame.Seconds), kCaptionScale);
+    sheet_pictures_.push_back(std::move(tile));
+  }
   if (in_preview) {
     if (!gif_open_) {
       const int delay_cs = static_cast<int>(std::lround(100.0 * preview_step_ / fps_));
@@ -74,7 +82,7 @@ bool RenderOutput::AddFrame(const FrameResult& frame, std::string* error) {
 }
 
 bool RenderOutput::Finish(std::string* error) {
-  if (pictures_ && frames_written_ > 0) {
+  if (pictures_ && frames_written_ > 0 && only_frame_ == 0) {
     const apescene::Image sheet = BuildContactSheet(sheet_pictures_, kSheetColumns, 4, 0xFF202020u);
     if (!apescene::WritePng(Path("contact_sheet.png"), sheet, false, error)) return false;
     if (gif_open_) {

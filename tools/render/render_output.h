@@ -1,6 +1,7 @@
 // The files of a render in its output folder:
 //   frame_0001.png ...   every frame (only when the device draws pixels)
 //   contact_sheet.png    up to 12 evenly spaced frames in a grid, each at most 320 pixels wide
+//                        and captioned with its frame number and time
 //   preview.gif          the frames at most 320 pixels wide, at most about 25 frames a second
 //   stats.csv            one row per frame (stats_table.h)
 // Frames are written as they come; the sheet, the GIF (kept as preview.gif.partial until then)
@@ -22,9 +23,12 @@ class RenderOutput {
   static constexpr int kSheetColumns = 4;
   static constexpr int kPreviewWidth = 320;
   static constexpr double kPreviewFps = 25.0;
+  static constexpr int kCaptionScale = 2;  // screen pixels per font pixel
 
-  // Creates the folder and removes the files an earlier render left in it.
-  bool Open(const std::string& folder, int frames, double fps, bool pictures, std::string* error);
+  // Creates the folder and removes the files an earlier render left in it. With `only_frame`
+  // above 0 that frame is the one picture written (no sheet, no preview).
+  bool Open(const std::string& folder, int frames, double fps, bool pictures, std::string* error,
+            int only_frame = 0);
   bool AddFrame(const FrameResult& frame, std::string* error);
   bool Finish(std::string* error);
 
@@ -41,6 +45,7 @@ class RenderOutput {
   int frames_ = 0;
   double fps_ = 30.0;
   bool pictures_ = false;
+  int only_frame_ = 0;
   int frames_written_ = 0;
   int preview_step_ = 1;
   GifWriter gif_;

@@ -69,8 +69,6 @@ FrameResult SceneRenderer::RenderFrame(int frame) {
   const std::int64_t target =
       start_ticks_ + std::llround(frame * static_cast<double>(TestClock::kTicksPerSecond) / fps_);
   clock_.Advance(target - ticks_);
-  const double frame_ms = static_cast<double>(target - ticks_) * 1000.0 /
-                          static_cast<double>(TestClock::kTicksPerSecond);
   ticks_ = target;
   context_.AdvanceFrame();
   scene_.Animate(result.Seconds);
@@ -112,11 +110,12 @@ FrameResult SceneRenderer::RenderFrame(int frame) {
   device_.ForgetCalls();
 
   for (std::size_t i = 0; i < emitters_.size(); ++i) {
-    const ParticleCounts counts = census_[i].After(*emitters_[i], frame_ms);
+    const ParticleCounts counts = census_[i].After(*emitters_[i]);
     result.Particles.Live += counts.Live;
     result.Particles.Attached += counts.Attached;
     result.Particles.Sliding += counts.Sliding;
     result.Particles.Births += counts.Births;
+    result.Particles.Deaths += counts.Deaths;
     result.Particles.LogicSteps += counts.LogicSteps;
   }
   return result;

@@ -13,14 +13,14 @@ void StatsTable::Add(const FrameResult& frame) {
 
 std::string StatsTable::Csv() const {
   std::string text =
-      "frame,seconds,live,attached,sliding,births,logic_steps,channel_ms,draw_ms,"
+      "frame,seconds,live,attached,sliding,births,deaths,logic_steps,channel_ms,draw_ms,"
       "simulation_and_vertex_ms,readback_ms\n";
   char line[256];
   for (const Row& r : rows_) {
-    std::snprintf(line, sizeof line, "%d,%.4f,%d,%d,%d,%d,%d,%.3f,%.3f,%.3f,%.3f\n", r.Frame,
+    std::snprintf(line, sizeof line, "%d,%.4f,%d,%d,%d,%d,%d,%d,%.3f,%.3f,%.3f,%.3f\n", r.Frame,
                   r.Seconds, r.Particles.Live, r.Particles.Attached, r.Particles.Sliding,
-                  r.Particles.Births, r.Particles.LogicSteps, r.ChannelMs, r.DrawMs,
-                  std::max(0.0, r.ChannelMs - r.DrawMs), r.ReadbackMs);
+                  r.Particles.Births, r.Particles.Deaths, r.Particles.LogicSteps, r.ChannelMs,
+                  r.DrawMs, std::max(0.0, r.ChannelMs - r.DrawMs), r.ReadbackMs);
     text += line;
   }
   return text;
@@ -45,6 +45,7 @@ StatsTable::Totals StatsTable::Summarise() const {
     totals.PeakAttached = std::max(totals.PeakAttached, r.Particles.Attached);
     totals.PeakSliding = std::max(totals.PeakSliding, r.Particles.Sliding);
     totals.Births += r.Particles.Births;
+    totals.Deaths += r.Particles.Deaths;
     totals.LogicSteps += r.Particles.LogicSteps;
     totals.MeanChannelMs += r.ChannelMs;
     totals.MaxChannelMs = std::max(totals.MaxChannelMs, r.ChannelMs);

@@ -1,7 +1,7 @@
 // The per-frame statistics of a render, written as stats.csv. Columns:
 //   frame, seconds                  frame number (from 1) and the scene time it shows
 //   live, attached, sliding         particles after the frame, over all emitters
-//   births, logic_steps             worked out from the pools (see particle_census.h)
+//   births, deaths, logic_steps     in the frame, exact (see particle_census.h)
 //   channel_ms                      wall time inside every channel's CallChannel
 //   draw_ms                         of which inside the device's draw calls
 //   simulation_and_vertex_ms        channel_ms - draw_ms: the emitter does simulation and vertex
@@ -30,6 +30,7 @@ class StatsTable {
     int PeakAttached = 0;
     int PeakSliding = 0;
     long long Births = 0;
+    long long Deaths = 0;
     long long LogicSteps = 0;
     double MeanChannelMs = 0.0;
     double MaxChannelMs = 0.0;

@@ -17,7 +17,8 @@ struct SummaryFacts {
   double WallSeconds = 0.0;
   int Messages = 0;
   std::string Folder;
-  int FramesWritten = 0;  // PNG frames; 0 on a device without pixels
+  int FramesWritten = 0;      // PNG frames; 0 on a device without pixels
+  std::string OnlyFrameFile;  // with --at: the one frame written
 };
 
 std::string RenderSummary(const SummaryFacts& facts, const StatsTable::Totals& totals);

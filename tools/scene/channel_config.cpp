@@ -1,6 +1,7 @@
 // Per-type settings of a channel definition: values, envelopes, textures, meshes, collision
 // objects and attractors. Types without settings of their own take only links.
 #include <algorithm>
+#include <cstdio>
 
 #include "host/attractor.h"
 #include "host/envelope_storage.h"
@@ -59,6 +60,47 @@ Tev_EnvelopeStorage::Interpolation ReadMode(const Json& value, const DocPath& pa
   throw SceneError(path, "expected \"linear\", \"step\" or \"smooth\", got \"" + text + "\"");
 }
 
+std::string Number(float value) {
+  char text[32];
+  std::snprintf(text, sizeof text, "%g", static_cast<double>(value));
+  return text;
+}
+
+// Keys out of order are used sorted, as the envelope channel sorts whatever it is given; two keys
+// at one x make a jump, but a third one there is never read and a repeated key says nothing.
+void NoteKeyMistakes(const std::vector<Tev_EnvelopeStorage::Key>& keys, const DocPath& path,
+                     std::vector<SceneWarning>* warnings) {
+  for (std::size_t i = 1; i < keys.size(); ++i) {
+    if (keys[i].X < keys[i - 1].X) {
+      warnings->push_back({path.Index(i), 0,
+                           "key x = " + Number(keys[i].X) +
+                               " comes after x = " + Number(keys[i - 1].X) +
+                               ": envelope keys are used sorted by x, so this curve is not the "
+                               "one written; write the keys in increasing x"});
+      break;
+    }
+  }
+  for (std::size_t i = 0; i < keys.size(); ++i) {
+    for (std::size_t j = i + 1; j < keys.size(); ++j) {
+      if (keys[j].X != keys[i].X) continue;
+      if (keys[j].Y == keys[i].Y) {
+        warnings->push_back(
+            {path.Index(j), 0,
+             "the key [" + Number(keys[j].X) + ", " + Number(keys[j].Y) + "] is given twice"});
+        return;
+      }
+      for (std::size_t k = j + 1; k < keys.size(); ++k) {
+        if (keys[k].X != keys[i].X) continue;
+        warnings->push_back({path.Index(j), 0,
+                             "three keys at x = " + Number(keys[i].X) +
+                                 ": two keys at one x make a jump, but the middle one is never "
+                                 "read"});
+        return;
+      }
+    }
+  }
+}
+
 }  // namespace
 
 void SceneBuilder::Configure(Qen_Channel* channel, const Json& definition, const DocPath& path) {
@@ -83,6 +125,7 @@ void SceneBuilder::ConfigureValue(Qen_Channel* channel, const Json& definition,
   const Track<float> track =
       ReadTrack(Require(definition, path, "value"), path.Key("value"), kNumber);
   value->SetValue(track.Sample(0.0));
+  RememberRange(channel, track);
   if (track.IsAnimated())
     scene_->Animators.push_back([value, track](double t) { value->SetValue(track.Sample(t)); });
 }
@@ -134,6 +177,7 @@ void SceneBuilder::SetEnvelopeKeys(Qen_Channel* channel, const Json& keys, const
     list.push_back({ReadNumber(key[0], at.Index(0)), ReadNumber(key[1], at.Index(1)),
                     key.size() == 3 ? ReadMode(key[2], at.Index(2)) : fallback});
   }
+  NoteKeyMistakes(list, path, &scene_->LoadWarnings);
   static_cast<Tev_EnvelopeStorage*>(channel)->SetKeys(list);
 }
 

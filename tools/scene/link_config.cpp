@@ -7,6 +7,9 @@
 #include "host/link_channels.h"
 #include "host/qen_channel.h"
 #include "host/type_guids.h"
+#include "tools/scene/link_reference.h"
+#include "tools/scene/name_suggestions.h"
+#include "tools/scene/procedural_images.h"
 #include "tools/scene/scene_builder.h"
 #include "tools/scene/scene_error.h"
 
@@ -16,23 +19,6 @@ namespace {
 const std::function<float(const Json&, const DocPath&)> kNumber = ReadNumber;
 const std::function<D3DXVECTOR3(const Json&, const DocPath&)> kVector = ReadVector3;
 const std::function<MatrixValue(const Json&, const DocPath&)> kMatrix = ReadMatrixValue;
-
-std::size_t EditDistance(const std::string& a, const std::string& b) {
-  std::vector<std::size_t> row(b.size() + 1);
-  for (std::size_t j = 0; j <= b.size(); ++j) row[j] = j;
-  for (std::size_t i = 1; i <= a.size(); ++i) {
-    std::size_t diagonal = row[0];
-    row[0] = i;
-    for (std::size_t j = 1; j <= b.size(); ++j) {
-      const std::size_t up = row[j];
-      const bool same = std::tolower(static_cast<unsigned char>(a[i - 1])) ==
-                        std::tolower(static_cast<unsigned char>(b[j - 1]));
-      row[j] = std::min({row[j] + 1, row[j - 1] + 1, diagonal + (same ? 0 : 1)});
-      diagonal = up;
-    }
-  }
-  return row[b.size()];
-}
 
 std::string LinkName(const ChildCreation& link) {
   return std::string(link.LinkName, strnlen(link.LinkName, sizeof link.LinkName));
@@ -58,15 +44,13 @@ int FindLink(Qen_Channel* channel, const std::string& key, const DocPath& path) 
   const int index = channel->FindChildLinkByName(key);
   if (index >= 0) return index;
   std::string message = "unknown link name for " + TypeNameOf(channel);
-  std::size_t best = key.size() / 3 + 2;  // close enough to be a slip of the keyboard
-  std::string suggestion;
-  for (int i = 0; i < channel->GetChildCreationCount(); ++i) {
-    const ChildCreation* link = channel->GetChildCreation(i);
-    if (link == nullptr) continue;
-    const std::size_t distance = EditDistance(key, LinkName(*link));
-    if (distance < best) best = distance, suggestion = LinkName(*link);
-  }
+  std::vector<std::string> names;
+  for (int i = 0; i < channel->GetChildCreationCount(); ++i)
+    if (const ChildCreation* link = channel->GetChildCreation(i)) names.push_back(LinkName(*link));
+  const std::string suggestion = SuggestName(key, names);
   if (!suggestion.empty()) message += " (did you mean \"" + suggestion + "\"?)";
+  if (!LinkReferences(TypeNameOf(channel)).empty())
+    message += "; ape-render --list-links " + TypeNameOf(channel) + " lists them all";
   throw SceneError(path, message);
 }
 
@@ -91,6 +75,9 @@ void SceneBuilder::ConfigureLinks(Qen_Channel* channel, const Json& links, const
         Link(channel, index,
              ResolveLinkValue(item.value()[i], at.Index(i), link.Type.TypeGuid, TypeName(link)),
              true, at.Index(i));
+    } else if (Qen_Channel* converted =
+                   ResolvePerSecond(channel, index, item.value(), at, links, path)) {
+      Link(channel, index, converted, false, at);
     } else {
       Link(channel, index, ResolveLinkValue(item.value(), at, link.Type.TypeGuid, TypeName(link)),
            false, at);
@@ -104,7 +91,10 @@ void SceneBuilder::Link(Qen_Channel* owner, int index, Qen_Channel* child, bool 
     if (!many) owner->SetChild(index, nullptr);
     return;
   }
-  if (many ? owner->AddChild(index, child) : owner->SetChild(index, child)) return;
+  if (many ? owner->AddChild(index, child) : owner->SetChild(index, child)) {
+    scene_->LinkSources.push_back({owner, index, child, path});
+    return;
+  }
   const ChildCreation& link = *owner->GetChildCreation(index);
   std::string what = "a channel (" + TypeNameOf(child) + ")";
   for (const Scene::NamedChannel& named : scene_->Named)
@@ -114,11 +104,22 @@ void SceneBuilder::Link(Qen_Channel* owner, int index, Qen_Channel* child, bool 
 }
 
 Qen_Channel* SceneBuilder::NamedChannel(const std::string& name, const DocPath& path,
-                                        const std::string& expected) {
+                                        const std::string& expected, const std::string& link_type) {
   if (Qen_Channel* channel = scene_->Find(name)) return channel;
-  if (expected.empty()) throw SceneError(path, "no channel is named \"" + name + "\"");
-  throw SceneError(path,
-                   "expected " + expected + ", got a string (\"" + name + "\" names no channel)");
+  std::string message = expected.empty() ? "no channel is named \"" + name + "\""
+                                         : "expected " + expected + ", got a string (\"" + name +
+                                               "\" names no channel)";
+  std::vector<std::string> names;
+  for (const Scene::NamedChannel& named : scene_->Named) names.push_back(named.Name);
+  const std::vector<std::string>& images = ProceduralImageNames();
+  if (std::find(images.begin(), images.end(), name) != images.end()) {
+    message += "; \"" + name + "\" is a built-in image: make a Texture channel of it, e.g. \"" +
+               name + "\": {\"type\": \"Texture\", \"image\": \"" + name + "\"}";
+    if (link_type == "Texture") message += ", or write {\"image\": \"" + name + "\"} here";
+  } else if (const std::string suggestion = SuggestName(name, names); !suggestion.empty()) {
+    message += " (did you mean \"" + suggestion + "\"?)";
+  }
+  throw SceneError(path, message);
 }
 
 Qen_Channel* SceneBuilder::ResolveLinkValue(const Json& value, const DocPath& path,
@@ -128,6 +129,8 @@ Qen_Channel* SceneBuilder::ResolveLinkValue(const Json& value, const DocPath& pa
   if (type == kValueGuid && !value.is_string() && !inline_definition) {
     const Track<float> track = ReadTrack(value, path, kNumber);
     auto* channel = static_cast<Qen_ValueChannel*>(CreateByGuid(type, type_name, path));
+    Remember(channel, "", path);
+    RememberRange(channel, track);
     channel->SetValue(track.Sample(0.0));
     if (track.IsAnimated())
       scene_->Animators.push_back(
@@ -137,6 +140,7 @@ Qen_Channel* SceneBuilder::ResolveLinkValue(const Json& value, const DocPath& pa
   if (type == kValueVectorGuid && !value.is_string() && !inline_definition) {
     const Track<D3DXVECTOR3> track = ReadTrack(value, path, kVector);
     auto* channel = static_cast<Qen_ValueVectorChannel*>(CreateByGuid(type, type_name, path));
+    Remember(channel, "", path);
     channel->SetVector(track.Sample(0.0));
     if (track.IsAnimated())
       scene_->Animators.push_back(
@@ -146,6 +150,7 @@ Qen_Channel* SceneBuilder::ResolveLinkValue(const Json& value, const DocPath& pa
   if (type == kMatrixGuid && !value.is_string() && !inline_definition) {
     const Track<MatrixValue> track = ReadTrack(value, path, kMatrix);
     auto* channel = static_cast<Qen_MatrixChannel*>(CreateByGuid(type, type_name, path));
+    Remember(channel, "", path);
     channel->SetMatrix(track.Sample(0.0).Matrix);
     if (track.IsAnimated())
       scene_->Animators.push_back(
@@ -154,6 +159,7 @@ Qen_Channel* SceneBuilder::ResolveLinkValue(const Json& value, const DocPath& pa
   }
   if (type == kEnvelopeStorageGuid && value.is_array()) {
     Qen_Channel* channel = CreateByGuid(type, type_name, path);
+    Remember(channel, "", path);
     SetEnvelopeKeys(channel, value, path, "linear");
     return channel;
   }
@@ -163,7 +169,7 @@ Qen_Channel* SceneBuilder::ResolveLinkValue(const Json& value, const DocPath& pa
                            : type == kMatrixGuid          ? "a 4x4 matrix or a transform object"
                            : type == kEnvelopeStorageGuid ? "a list of keys [[x, y], ...]"
                                                           : "";
-    return NamedChannel(value.get<std::string>(), path, expected);
+    return NamedChannel(value.get<std::string>(), path, expected, type_name);
   }
   return ResolveChannel(value, path, type, type_name);
 }
@@ -171,7 +177,7 @@ Qen_Channel* SceneBuilder::ResolveLinkValue(const Json& value, const DocPath& pa
 Qen_Channel* SceneBuilder::ResolveChannel(const Json& value, const DocPath& path, const GUID& type,
                                           const std::string& type_name) {
   if (value.is_string()) {
-    Qen_Channel* channel = NamedChannel(value.get<std::string>(), path, "");
+    Qen_Channel* channel = NamedChannel(value.get<std::string>(), path, "", type_name);
     const ChannelType record = channel->GetChannelType();
     if (!(record.TypeGuid == type) && !(record.BaseTypeGuid == type))
       throw SceneError(path, "channel \"" + value.get<std::string>() + "\" (" +
@@ -187,6 +193,7 @@ Qen_Channel* SceneBuilder::ResolveChannel(const Json& value, const DocPath& path
   } else {
     channel = CreateByGuid(type, type_name, path);
   }
+  Remember(channel, "", path);
   Configure(channel, value, path);
   return channel;
 }

@@ -34,4 +34,16 @@ Qen_Channel* Scene::Find(const std::string& name) const {
   return nullptr;
 }
 
+const Scene::ChannelSource* Scene::SourceOf(const Qen_Channel* channel) const {
+  for (const ChannelSource& source : ChannelSources)
+    if (source.Channel == channel) return &source;
+  return nullptr;
+}
+
+const Scene::LinkSource* Scene::SourceOf(const Qen_Channel* owner, int index) const {
+  for (const LinkSource& source : LinkSources)
+    if (source.Owner == owner && source.Index == index) return &source;
+  return nullptr;
+}
+
 }  // namespace apescene

@@ -9,6 +9,8 @@
 
 #include "platform/d3d9_types.h"
 #include "tools/scene/animation.h"
+#include "tools/scene/doc_path.h"
+#include "tools/scene/scene_warning.h"
 
 class Qen_Channel;
 class Qen_ValueVectorChannel;
@@ -73,6 +75,35 @@ class Scene {
   std::vector<Tev_MultiCollisionManager*> CollisionManagers;
   bool MovingGeometry = false;  // some mesh has an animated transform
   Qen_ValueVectorChannel* CameraEye = nullptr;
+
+  // Where each channel and each link was written, for messages about them (the lines are filled
+  // in once the whole document is read).
+  struct ChannelSource {
+    const Qen_Channel* Channel;
+    std::string Name;  // empty for a channel written inline in a link
+    DocPath Path;
+    int Line = 0;
+    // A Value channel's least and greatest value over the shot (its keys), when animated.
+    bool Animated = false;
+    float Least = 0.0f;
+    float Greatest = 0.0f;
+  };
+  struct LinkSource {
+    const Qen_Channel* Owner;
+    int Index;
+    const Qen_Channel* Child;
+    DocPath Path;
+    int Line = 0;
+  };
+  std::vector<ChannelSource> ChannelSources;  // in the order made
+  std::vector<LinkSource> LinkSources;        // in the order linked
+  // Likely mistakes: what the loader noticed while reading (LoadWarnings), and everything the
+  // scene check found when the load ended (Warnings, which includes LoadWarnings).
+  std::vector<SceneWarning> LoadWarnings;
+  std::vector<SceneWarning> Warnings;
+
+  const ChannelSource* SourceOf(const Qen_Channel* channel) const;
+  const LinkSource* SourceOf(const Qen_Channel* owner, int index) const;
 };
 
 }  // namespace apescene

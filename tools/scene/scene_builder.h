@@ -31,6 +31,10 @@ class SceneBuilder {
   Qen_Channel* CreateByName(const std::string& type_name, const DocPath& type_path);
   Qen_Channel* CreateByGuid(const GUID& type, const std::string& type_name, const DocPath& path);
   std::string ResolveFile(const std::string& relative) const;
+  // Notes where a channel was written (a named one with its name), for later messages.
+  void Remember(const Qen_Channel* channel, const std::string& name, const DocPath& path);
+  // Notes a Value channel's range over the shot.
+  void RememberRange(const Qen_Channel* channel, const Track<float>& track);
 
   // channel_config.cpp: fills a channel from its definition object.
   void Configure(Qen_Channel* channel, const Json& definition, const DocPath& path);
@@ -54,8 +58,16 @@ class SceneBuilder {
   // A named channel of the given type, or an inline definition of one.
   Qen_Channel* ResolveChannel(const Json& value, const DocPath& path, const GUID& type,
                               const std::string& type_name);
+  // `expected` names the value kind a string stood in for ("a number"), empty for a channel
+  // link; `link_type` is the type the link takes, for hints.
   Qen_Channel* NamedChannel(const std::string& name, const DocPath& path,
-                            const std::string& expected);
+                            const std::string& expected, const std::string& link_type = "");
+  // A number or vector link written per second ({"per_second": ...} or
+  // {"per_second_squared": ...}), converted to per logic step with the emitter's logic rate.
+  // Null when `value` is not written per second. `links` is the owner's whole links object,
+  // where the logic rate is found.
+  Qen_Channel* ResolvePerSecond(Qen_Channel* owner, int index, const Json& value,
+                                const DocPath& path, const Json& links, const DocPath& links_path);
   void Link(Qen_Channel* owner, int index, Qen_Channel* child, bool many, const DocPath& path);
 
   Scene* scene_;

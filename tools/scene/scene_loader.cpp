@@ -1,5 +1,6 @@
 #include "tools/scene/scene_loader.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <filesystem>
@@ -9,7 +10,9 @@
 #include "host/link_channels.h"
 #include "host/plugin_loader.h"
 #include "tools/scene/json_locator.h"
+#include "tools/scene/name_suggestions.h"
 #include "tools/scene/scene_builder.h"
+#include "tools/scene/scene_check.h"
 #include "tools/scene/scene_error.h"
 
 namespace apescene {
@@ -168,6 +171,7 @@ void SceneBuilder::ReadChannels(const Json& channels, const DocPath& path) {
     const std::string type = ReadString(Require(item.value(), at, "type"), at.Key("type"));
     Qen_Channel* channel = CreateByName(type, at.Key("type"));
     channel->SetChannelName(item.key().c_str());
+    Remember(channel, item.key(), at);
     scene_->Named.push_back({item.key(), channel});
     made.emplace_back(channel, &item.value());
   }
@@ -187,7 +191,11 @@ Qen_Channel* SceneBuilder::CreateByName(const std::string& type_name, const DocP
     if (!error.empty()) throw SceneError(type_path, error);
     std::string known;
     for (const std::string& name : types_.TypeNames) known += (known.empty() ? "" : ", ") + name;
-    std::string message = "unknown channel type \"" + type_name + "\" (known: " + known + ")";
+    std::string message = "unknown channel type \"" + type_name + "\"";
+    if (const std::string suggestion = SuggestName(type_name, types_.TypeNames);
+        !suggestion.empty())
+      message += "; did you mean \"" + suggestion + "\"?";
+    message += " (known: " + known + ")";
     for (const std::string& problem : types_.Problems) message += "; " + problem;
     throw SceneError(type_path, message);
   }
@@ -203,6 +211,24 @@ Qen_Channel* SceneBuilder::CreateByGuid(const GUID& type, const std::string& typ
     throw SceneError(path, "cannot create a \"" + type_name + "\" channel: " + error);
   scene_->Channels.emplace_back(channel);
   return channel;
+}
+
+void SceneBuilder::Remember(const Qen_Channel* channel, const std::string& name,
+                            const DocPath& path) {
+  scene_->ChannelSources.push_back({channel, name, path});
+}
+
+void SceneBuilder::RememberRange(const Qen_Channel* channel, const Track<float>& track) {
+  if (!track.IsAnimated()) return;
+  for (Scene::ChannelSource& source : scene_->ChannelSources) {
+    if (source.Channel != channel) continue;
+    source.Animated = true;
+    source.Least = source.Greatest = track.Keys.front().Value;
+    for (const auto& key : track.Keys) {
+      source.Least = std::min(source.Least, key.Value);
+      source.Greatest = std::max(source.Greatest, key.Value);
+    }
+  }
 }
 
 std::string SceneBuilder::ResolveFile(const std::string& relative) const {
@@ -239,7 +265,7 @@ bool Run(const SceneSource& source, std::string* error, Build build) {
   try {
     if (locator.HasDuplicateKey())
       throw SceneError(locator.DuplicateKey(), "this key is given twice in the same object");
-    build(root);
+    build(root, locator);
   } catch (const SceneError& e) {
     const std::string where = WithLine(source.DisplayName, locator.LineOf(e.Path()));
     *error = OneLine(where + ": " + (e.Path().IsRoot() ? "" : e.Path().Text() + ": ") + e.what());
@@ -257,15 +283,20 @@ std::unique_ptr<Scene> LoadScene(const SceneSource& source, PluginLoader& loader
                                  std::string* error) {
   auto scene = std::make_unique<Scene>();
   scene->SourceName = source.DisplayName;
-  const bool ok = Run(source, error, [&](const Json& root) {
+  const bool ok = Run(source, error, [&](const Json& root, const JsonLocator& locator) {
     SceneBuilder(scene.get(), &loader, source.BaseDirectory).Build(root);
+    for (Scene::ChannelSource& place : scene->ChannelSources)
+      place.Line = locator.LineOf(place.Path);
+    for (Scene::LinkSource& place : scene->LinkSources) place.Line = locator.LineOf(place.Path);
+    for (SceneWarning& warning : scene->LoadWarnings) warning.Line = locator.LineOf(warning.Path);
+    scene->Warnings = CheckScene(*scene);
   });
   return ok ? std::move(scene) : nullptr;
 }
 
 bool ReadSceneSettings(const SceneSource& source, RenderSettings* settings, std::string* error) {
   Scene scene;
-  const bool ok = Run(source, error, [&](const Json& root) {
+  const bool ok = Run(source, error, [&](const Json& root, const JsonLocator&) {
     SceneBuilder(&scene, nullptr, source.BaseDirectory).BuildSettings(root);
   });
   if (ok) *settings = scene.Settings;
