@@ -47,7 +47,7 @@ update-golden: build
 	  $(BUILD_DIR)/bin/visual_regression_test --gtest_filter='Scenes/*'
 
 bench: deps
-	cmake -S . -B $(BENCH_DIR) $(CMAKE_GEN) -DCMAKE_BUILD_TYPE=Release -DCMAKE_CXX_FLAGS_RELEASE=-O2 -DAPE_BUILD_TESTS=OFF
+	cmake -S . -B $(BENCH_DIR) $(CMAKE_GEN) -DCMAKE_BUILD_TYPE=Release "-DCMAKE_CXX_FLAGS_RELEASE=-O2 -DNDEBUG" -DAPE_BUILD_TESTS=OFF
 	cmake --build $(BENCH_DIR) -j $(JOBS)
 	@for b in $(BENCH_DIR)/bin/bench-*; do echo "== $$b"; $$b --benchmark_counters_tabular=true; done
 

@@ -49,7 +49,9 @@ BENCHMARK(BM_Frame_PointSprites)->Arg(100'000)->Unit(benchmark::kMicrosecond);
 
 const bool kFrameGoals =
     bench::AddBudget("working frame, 10,000 quads, 60 steps/s at 60 Hz", "BM_Frame_Quads/10000",
+                     0.5e-3) &&
+    bench::AddBudget("working frame, 10,000 spinning quads", "BM_Frame_QuadsSpinning/10000",
                      1e-3) &&
-    bench::AddBudget("working frame, 10,000 spinning quads", "BM_Frame_QuadsSpinning/10000", 1e-3);
+    bench::AddBudget("working frame, 100,000 point sprites", "BM_Frame_PointSprites/100000", 4e-3);
 
 }  // namespace

@@ -36,15 +36,31 @@ Tev_AdvPE_Attractor::Tev_AdvPE_Attractor() {
 
 D3DXVECTOR3 Tev_AdvPE_Attractor::GetForceAtPosition(D3DXVECTOR3 position) {
   if (!IsFinite(position)) return {0.0f, 0.0f, 0.0f};
+  return ForceAt(TakeField(), position);
+}
+
+Tev_AdvPE_Attractor::Field Tev_AdvPE_Attractor::TakeField() {
+  Field field;
   Qen_ValueChannel* linear_link = ValueLink(*this, kLinkLinearFalloff);
-  const bool linear = linear_link ? IsYes(linear_link->GetValue()) : FalloffMode == Falloff::Linear;
-  const Vec3d centre = ToVec3d(VectorOr(*this, kLinkPosition, Position));
-  const Vec3d axis = ToVec3d(VectorOr(*this, kLinkVortexAxis, VortexAxis));
-  const double strength = ValueOr(*this, kLinkStrength, Strength);
-  const double vortex_strength = ValueOr(*this, kLinkVortexStrength, VortexStrength);
+  field.Linear = linear_link ? IsYes(linear_link->GetValue()) : FalloffMode == Falloff::Linear;
+  field.Centre = VectorOr(*this, kLinkPosition, Position);
+  field.Axis = VectorOr(*this, kLinkVortexAxis, VortexAxis);
+  field.Strength = ValueOr(*this, kLinkStrength, Strength);
+  field.VortexStrength = ValueOr(*this, kLinkVortexStrength, VortexStrength);
+  field.MinimumRadius = ValueOr(*this, kLinkMinimumRadius, MinimumRadius);
+  field.Radius = ValueOr(*this, kLinkRadius, Radius);
+  return field;
+}
+
+D3DXVECTOR3 Tev_AdvPE_Attractor::ForceAt(const Field& field, D3DXVECTOR3 position) {
+  if (!IsFinite(position)) return {0.0f, 0.0f, 0.0f};
+  const Vec3d centre = ToVec3d(field.Centre);
+  const Vec3d axis = ToVec3d(field.Axis);
+  const double strength = field.Strength;
+  const double vortex_strength = field.VortexStrength;
   const Vec3d offset = ToVec3d(position) - centre;  // from the centre to the point
-  const double falloff = FalloffFactor(linear, ValueOr(*this, kLinkMinimumRadius, MinimumRadius),
-                                       ValueOr(*this, kLinkRadius, Radius), Length(offset));
+  const double falloff =
+      FalloffFactor(field.Linear, field.MinimumRadius, field.Radius, Length(offset));
 
   Vec3d force = Normalized(-offset) * (strength * falloff);
   force += Normalized(Cross(axis, offset)) * (vortex_strength * falloff);

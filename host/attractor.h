@@ -39,6 +39,21 @@ class Tev_AdvPE_Attractor : public Qen_Channel {
   // The force at `position`; finite for every finite input, zero for a non-finite one.
   D3DXVECTOR3 GetForceAtPosition(D3DXVECTOR3 position);
 
+  // The field's settings as the links and fields give them now: what GetForceAtPosition reads
+  // afresh on every call. A caller evaluating many points while nothing can change the links
+  // (a logic step) takes them once and gets the same forces from ForceAt.
+  struct Field {
+    bool Linear = false;
+    D3DXVECTOR3 Centre{0.0f, 0.0f, 0.0f};
+    D3DXVECTOR3 Axis{0.0f, 1.0f, 0.0f};
+    float Strength = 0.0f;
+    float VortexStrength = 0.0f;
+    float MinimumRadius = 0.0f;
+    float Radius = 0.0f;
+  };
+  Field TakeField();
+  static D3DXVECTOR3 ForceAt(const Field& field, D3DXVECTOR3 position);
+
   // Host API.
   D3DXVECTOR3 Position{0.0f, 0.0f, 0.0f};
   float Strength = 1.0f;  // negative repels

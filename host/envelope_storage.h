@@ -11,6 +11,7 @@
 #include <cstddef>
 #include <vector>
 
+#include "host/envelope_sampler.h"
 #include "host/qen_channel.h"
 
 class Tev_EnvelopeStorage : public Qen_Channel {
@@ -29,7 +30,8 @@ class Tev_EnvelopeStorage : public Qen_Channel {
 
   // Contract used by plug-ins; none of these allocates or throws.
   void Initialize();  // prepares the curve for sampling; cheap when nothing changed
-  float GetEnvelopeValue(float x);
+  // Inline: a plug-in may sample several curves per particle and logic step.
+  float GetEnvelopeValue(float x) { return GetSampler().At(x); }
   float GetMinIndex();  // the first key's x (0 without keys)
   float GetMaxIndex();  // the last key's x (0 without keys)
 
@@ -42,13 +44,33 @@ class Tev_EnvelopeStorage : public Qen_Channel {
   int GetKeyCount() const;
   const std::vector<Key>& GetKeys() const;  // in x order
 
+  // A view for sampling many times, valid until the keys are edited or the curve is destroyed.
+  // Linear and step spans sample from what Initialize prepared; before Initialize, after an edit
+  // and with smooth spans the view takes the general path. Both give the same values.
+  EnvelopeSampler GetSampler() const {
+    if (!Prepared) return EnvelopeSampler(*this);
+    return EnvelopeSampler(*this, PreparedLookup, KeyX.data(), static_cast<int>(Keys.size()),
+                           Segments.data(), Keys.empty() ? 0.0f : Keys.front().X, InverseSpacing);
+  }
+  // The general path: any interpolation, prepared or not.
+  float SampleGeneral(float x) const;
+
  private:
   // Index of the last key whose x is at most `x`, for x strictly inside the key range.
   std::size_t FindSpan(float x) const;
   void InsertSorted(const Key& key);
+  // After any edit: drops the prepared data and sizes its arrays for the new keys.
+  void KeysChanged();
+  void PrepareSegments();
 
   std::vector<Key> Keys;  // kept sorted by x
   bool Dirty = true;
+  // What Initialize prepares for the inline path; sized by the setters, so that Initialize does
+  // not allocate. Prepared only while the sizes match the keys and no span is smooth.
+  std::vector<float> KeyX;  // the keys' x in order, then NaN up to the counting lookup's slots
+  std::vector<EnvelopeSegment> Segments;  // before the first key, one per span, from the last on
+  bool Prepared = false;
+  EnvelopeSampler::Lookup PreparedLookup = EnvelopeSampler::Lookup::General;
   // Set by Initialize when the keys are evenly spaced: the span is then found by one division.
   bool EvenlySpaced = false;
   double InverseSpacing = 0.0;  // spans per unit of x

@@ -5,6 +5,7 @@
 // are defined across plugin/, simulation/ and render/, one file per concern.
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <vector>
 
@@ -71,6 +72,9 @@ class Tev_AdvancedParticleEmitter : public Tev_DX8_ObjectDataChannel {
 
   // --- Interpolation ---
   void InterpolateParticles(float t);
+  // The same, building each slot's point-sprite vertex (as UpdatePointSpriteVertexBuffer does)
+  // in the same pass over the pool; the buffer copy is left to CopyPointSpritesToBuffer.
+  void InterpolateParticlesAndPointSprites(float t);
 
   // --- Quad path ---
   void UpdateLocalVertexBuffer();
@@ -80,7 +84,9 @@ class Tev_AdvancedParticleEmitter : public Tev_DX8_ObjectDataChannel {
 
   // --- Point-sprite path ---
   void InitializePointSpriteVertexBuffer();
-  void UpdatePointSpriteVertexBuffer();
+  void UpdatePointSpriteVertexBuffer();  // every slot's vertex, then the buffer copy
+  std::size_t PointSpriteSlots() const;  // slots with a vertex in PointSpriteVertices
+  void CopyPointSpritesToBuffer();
   void StreamPointSprites();
   void RenderPointSprites();
 
@@ -94,10 +100,13 @@ class Tev_AdvancedParticleEmitter : public Tev_DX8_ObjectDataChannel {
   void ReadAttachedSettings();
   void ReadCollisionOutcomes();
   void RunLogicStep();                 // one logic step over the pool
+  void UpdateParticles();              // each record's pending updates, in index order
   void UpdateParticle(int index);      // dispatch: attached, inactive or live
   void UpdateLiveParticle(int index);  // stages L1 to L14
   void UpdateAttachedParticle(Particle& particle);
-  void ApplySizeEnvelope(Particle& particle);  // live and sliding size
+  // Live and sliding size, and colour, through Step.Envelopes: the running step's views, or
+  // those UpdateParticle took.
+  void ApplySizeEnvelope(Particle& particle);
   void ApplyColorEnvelopes(Particle& particle);
   void CollisionStage(Particle& particle);       // L8
   void SmokeStage(int index);                    // L9a to L9f

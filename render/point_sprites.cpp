@@ -6,6 +6,7 @@
 #include "host/device_channel.h"
 #include "plugin/advanced_particle_emitter.h"
 #include "render/pass_states.h"
+#include "render/point_sprite_vertex.h"
 #include "render/render_sizes.h"
 
 namespace {
@@ -43,16 +44,19 @@ void Tev_AdvancedParticleEmitter::InitializePointSpriteVertexBuffer() {
   }
 }
 
+std::size_t Tev_AdvancedParticleEmitter::PointSpriteSlots() const {
+  if (PointSpriteVertices == nullptr) return 0;
+  return std::min(PointSpriteCount(ParticleCount), Particles.size());
+}
+
 void Tev_AdvancedParticleEmitter::UpdatePointSpriteVertexBuffer() {
-  if (PointSpriteVertices == nullptr) return;
-  const std::size_t count = std::min(PointSpriteCount(ParticleCount), Particles.size());
-  for (std::size_t i = 0; i < count; ++i) {
-    const Particle& particle = Particles[i];
-    // A dead particle's slot shrinks to nothing, as its quad collapses on the quad path.
-    const float size = particle.Active ? particle.Size : 0.0f;
-    PointSpriteVertices[i] = {particle.RenderPosition, size, particle.Color};
-  }
-  if (PointSpriteVertexBuffer == nullptr) return;
+  const std::size_t count = PointSpriteSlots();
+  for (std::size_t i = 0; i < count; ++i) PointSpriteVertices[i] = PointSpriteOf(Particles[i]);
+  CopyPointSpritesToBuffer();
+}
+
+void Tev_AdvancedParticleEmitter::CopyPointSpritesToBuffer() {
+  if (PointSpriteVertices == nullptr || PointSpriteVertexBuffer == nullptr) return;
   // The buffer was created with this very length, so it fits a UINT.
   const std::size_t bytes = PointSpriteCount(ParticleCount) * kPointSpriteStride;
   void* locked = nullptr;

@@ -17,6 +17,21 @@ void HoldMainEnvelopes(Tev_AdvancedParticleEmitter& e) {
   e.BlueEnvelope = LinkAs<Tev_EnvelopeStorage>(e, kLinkBlueColorEnvelope);
 }
 
+MainEnvelopeViews TakeMainEnvelopeViews(const Tev_AdvancedParticleEmitter& e) {
+  static constexpr EnvelopeSegment kOne{0.0, 1.0, 0.0, 1.0, 1.0};
+  static constexpr EnvelopeSegment kZero{};
+  const auto view = [](const Tev_EnvelopeStorage* envelope, const EnvelopeSegment& absent) {
+    return envelope ? envelope->GetSampler() : EnvelopeSampler(absent);
+  };
+  MainEnvelopeViews views{view(e.SizeEnvelope, kOne), view(e.AlphaEnvelope, kZero),
+                          view(e.RedEnvelope, kZero), view(e.GreenEnvelope, kZero),
+                          view(e.BlueEnvelope, kZero)};
+  views.RedSharesAlpha = views.Red.SharesLookupWith(views.Alpha);
+  views.GreenSharesRed = views.Green.SharesLookupWith(views.Red);
+  views.BlueSharesGreen = views.Blue.SharesLookupWith(views.Green);
+  return views;
+}
+
 std::uint32_t PackColorClamped(std::int32_t alpha, std::int32_t red, std::int32_t green,
                                std::int32_t blue) {
   const auto clamp = [](std::int32_t c) { return std::clamp(c, 0, 255); };

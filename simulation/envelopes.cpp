@@ -25,7 +25,7 @@ std::int32_t ScaledByte(std::int32_t captured, Tev_EnvelopeStorage* envelope, fl
 
 void Tev_AdvancedParticleEmitter::ApplySizeEnvelope(Particle& p) {
   if (!p.Sliding) {
-    p.Size = NotNegative(ValueOr(SizeEnvelope, p.NormalizedAge, 1.0f) * p.SizeMultiplier);
+    p.Size = sim::LiveSize(Step.Envelopes, p);
     return;
   }
   // Sliding: the envelope is an offset added to the multiplier and the size captured on contact.
@@ -36,10 +36,7 @@ void Tev_AdvancedParticleEmitter::ApplySizeEnvelope(Particle& p) {
 void Tev_AdvancedParticleEmitter::ApplyColorEnvelopes(Particle& p) {
   // Smoke debug colours are written by the smoke collision instead.
   if (SmokeEnabled && Frame.SmokeSettings->DebugColours) return;
-  const float x = p.NormalizedAge;
-  p.Color =
-      sim::PackColorLowBits(sim::ColorByteAt(AlphaEnvelope, x), sim::ColorByteAt(RedEnvelope, x),
-                            sim::ColorByteAt(GreenEnvelope, x), sim::ColorByteAt(BlueEnvelope, x));
+  p.Color = sim::LiveColor(Step.Envelopes, p.NormalizedAge);
 }
 
 void Tev_AdvancedParticleEmitter::UpdateAttachedParticle(Particle& p) {

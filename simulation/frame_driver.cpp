@@ -83,10 +83,14 @@ void ReadLogicRate(Tev_AdvancedParticleEmitter& e) {
       sim::LogicRateUsable(rate) ? 1000.0f / rate : std::numeric_limits<float>::infinity();
 }
 
+// Whether the banked time runs a logic step now.
+bool LogicStepDue(const Tev_AdvancedParticleEmitter& e) {
+  return sim::LogicRateUsable(e.LogicUpdatesPerSecond) && e.LogicAccumulator > e.LogicInterval;
+}
+
 void RunLogicSteps(Tev_AdvancedParticleEmitter& e) {
-  if (!sim::LogicRateUsable(e.LogicUpdatesPerSecond)) return;
   int steps = 0;
-  while (e.LogicAccumulator > e.LogicInterval) {
+  while (LogicStepDue(e)) {
     e.VerticesDirty = false;
     e.LogicAccumulator -= e.LogicInterval;
     ++steps;
@@ -104,25 +108,41 @@ bool SimulationLinksPresent(const Tev_AdvancedParticleEmitter& e) {
          e.GetChild(kLinkBirthsPerSecond);
 }
 
-void Simulate(Tev_AdvancedParticleEmitter& e) {
+// Returns whether the point-sprite vertices were built, with the interpolation.
+bool Simulate(Tev_AdvancedParticleEmitter& e) {
   e.BirthsPerSecond = ValueLink(e, kLinkBirthsPerSecond)->GetValue() * e.SimulationScaler;
   const ElapsedTime elapsed = MeasureElapsed(e);
   AdvanceActiveTimer(e, elapsed.Seconds);
   RunBirths(e, elapsed.Ms);
 
   ReadLogicRate(e);
-  // Ageing is per frame in real seconds, for every record.
-  for (int i = 0; i < e.ParticleCount; ++i) e.Particles[i].Age += elapsed.Seconds;
   e.LogicAccumulator += elapsed.Ms;
+  // Ageing is per frame in real seconds, for every record, before any update of the frame. When a
+  // logic step runs, its pass over the pool ages each record just before its first update.
+  if (LogicStepDue(e)) {
+    e.Step.AgeingPending = true;
+    e.Step.AgeSeconds = elapsed.Seconds;
+  } else {
+    for (int i = 0; i < e.ParticleCount; ++i) e.Particles[i].Age += elapsed.Seconds;
+  }
   RunLogicSteps(e);
 
+  // Vertices about to be rebuilt from the drawn state are built in the interpolation's pass.
+  if (e.VerticesDirty && e.HardwareParticles) {
+    e.InterpolateParticlesAndPointSprites(sim::BlendFactor(e));
+    return true;
+  }
   e.InterpolateParticles(sim::BlendFactor(e));
+  return false;
 }
 
-void RebuildVerticesAndDraw(Tev_AdvancedParticleEmitter& e) {
+void RebuildVerticesAndDraw(Tev_AdvancedParticleEmitter& e, bool pointSpritesBuilt) {
   if (e.VerticesDirty) {
     if (e.HardwareParticles) {
-      e.UpdatePointSpriteVertexBuffer();
+      if (pointSpritesBuilt)
+        e.CopyPointSpritesToBuffer();
+      else
+        e.UpdatePointSpriteVertexBuffer();
     } else {
       e.UpdateLocalVertexBuffer();
       e.WriteLocalVertexBufferToBaseClass();
@@ -170,8 +190,8 @@ void Tev_AdvancedParticleEmitter::CallChannel() {
     if (!NewFrame) return;
 
     ReadLinks();
-    if (SimulationLinksPresent(*this)) Simulate(*this);
-    RebuildVerticesAndDraw(*this);
+    const bool pointSpritesBuilt = SimulationLinksPresent(*this) && Simulate(*this);
+    RebuildVerticesAndDraw(*this, pointSpritesBuilt);
   } catch (...) {
     // Nothing may escape into the host; the next frame starts afresh.
     ShowDebug("APE: frame update failed");

@@ -5,11 +5,12 @@
 #include "host/smoke_settings.h"
 #include "plugin/advanced_particle_emitter.h"
 #include "plugin/link_table.h"
+#include "simulation/envelope_sampling.h"
 
 namespace {
 
-// The attractor list as every update of the step would enumerate it; left to the updates when
-// the link reading stage could not reserve room for it (the step allocates nothing).
+// The attractors' fields as every update of the step would read them; left to the updates when
+// the link reading stage could not reserve room for them (the step allocates nothing).
 void TakeAttractors(Tev_AdvancedParticleEmitter& e) {
   sim::LogicStepState& step = e.Step;
   step.Attractors.clear();
@@ -19,7 +20,7 @@ void TakeAttractors(Tev_AdvancedParticleEmitter& e) {
   for (int a = 0; a < count; ++a) {
     auto* attractor =
         static_cast<Tev_AdvPE_Attractor*>(e.GetChildFromLinkPosition(kLinkAttractors, a));
-    if (attractor) step.Attractors.push_back(attractor);
+    if (attractor) step.Attractors.push_back(attractor->TakeField());
   }
 }
 
@@ -33,10 +34,18 @@ void PrepareSmokePairs(Tev_AdvancedParticleEmitter& e) {
 class StepScope {
  public:
   explicit StepScope(Tev_AdvancedParticleEmitter& e) : e_(e) {
+    e.Step.Envelopes = sim::TakeMainEnvelopeViews(e);
+    e.Step.EnvelopesTaken = true;
     TakeAttractors(e);
     PrepareSmokePairs(e);
   }
   ~StepScope() {
+    // A step that ended before its pass over the pool still ages every record in its frame.
+    if (e_.Step.AgeingPending) {
+      e_.Step.AgeingPending = false;
+      for (int i = 0; i < e_.ParticleCount; ++i) e_.Particles[i].Age += e_.Step.AgeSeconds;
+    }
+    e_.Step.EnvelopesTaken = false;
     e_.Step.AttractorsTaken = false;
     e_.Step.SmokePairs.Clear();
   }
@@ -51,9 +60,5 @@ class StepScope {
 
 void Tev_AdvancedParticleEmitter::RunLogicStep() {
   const StepScope scope(*this);
-  for (int i = 0; i < ParticleCount; ++i) {
-    const std::int32_t steps = Particles[i].PendingSteps;
-    for (std::int32_t k = 0; k < steps; ++k) UpdateParticle(i);
-    Particles[i].PendingSteps = 1;
-  }
+  UpdateParticles();
 }

@@ -49,6 +49,7 @@ void InsertionSort(std::uint64_t* keys, int count) {
 
 DistanceEnvelope::DistanceEnvelope(Tev_EnvelopeStorage* envelope)
     : Envelope(envelope),
+      View(envelope ? envelope->GetSampler() : EnvelopeSampler()),
       Minimum(envelope ? envelope->GetMinIndex() : 0.0f),
       Maximum(envelope ? envelope->GetMaxIndex() : 0.0f) {}
 
@@ -69,10 +70,8 @@ bool EvaluatePair(const PairEnvelopes& envelopes, const D3DXVECTOR3& d, float r,
   if (!force->Repels && !force->Attracts) return false;
   // The direction d / r, the same value wherever the definition writes it.
   const D3DXVECTOR3 direction = d / r;
-  if (force->Repels)
-    force->Repulsion = direction * envelopes.Repulsion.Envelope->GetEnvelopeValue(r) * strength;
-  if (force->Attracts)
-    force->Attraction = direction * envelopes.Attraction.Envelope->GetEnvelopeValue(r) * strength;
+  if (force->Repels) force->Repulsion = direction * envelopes.Repulsion.View.At(r) * strength;
+  if (force->Attracts) force->Attraction = direction * envelopes.Attraction.View.At(r) * strength;
   return true;
 }
 

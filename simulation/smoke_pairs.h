@@ -10,6 +10,7 @@
 #include <cstdint>
 #include <vector>
 
+#include "host/envelope_sampler.h"
 #include "platform/d3dx_math.h"
 #include "simulation/particle.h"
 
@@ -18,9 +19,11 @@ class Tev_AdvPE_SmokeSettings;
 
 namespace sim {
 
-// An envelope over distance, acting only strictly inside its index range.
+// An envelope over distance, acting only strictly inside its index range. Sampled through a view
+// taken when this is made: valid while the curve is not edited (within a logic step).
 struct DistanceEnvelope {
   Tev_EnvelopeStorage* Envelope = nullptr;
+  EnvelopeSampler View;
   float Minimum = 0.0f;
   float Maximum = 0.0f;
 
