@@ -122,30 +122,37 @@ Qen_Channel* SceneBuilder::NamedChannel(const std::string& name, const DocPath& 
   throw SceneError(path, message);
 }
 
+Qen_Channel* SceneBuilder::MakeValueChannel(const Track<float>& track, const GUID& type,
+                                            const std::string& type_name, const DocPath& path) {
+  auto* channel = static_cast<Qen_ValueChannel*>(CreateByGuid(type, type_name, path));
+  Remember(channel, "", path);
+  RememberRange(channel, track);
+  channel->SetValue(track.Sample(0.0));
+  if (track.IsAnimated())
+    scene_->Animators.push_back([channel, track](double t) { channel->SetValue(track.Sample(t)); });
+  return channel;
+}
+
+Qen_Channel* SceneBuilder::MakeVectorChannel(const Track<D3DXVECTOR3>& track, const GUID& type,
+                                             const std::string& type_name, const DocPath& path) {
+  auto* channel = static_cast<Qen_ValueVectorChannel*>(CreateByGuid(type, type_name, path));
+  Remember(channel, "", path);
+  channel->SetVector(track.Sample(0.0));
+  if (track.IsAnimated())
+    scene_->Animators.push_back(
+        [channel, track](double t) { channel->SetVector(track.Sample(t)); });
+  return channel;
+}
+
 Qen_Channel* SceneBuilder::ResolveLinkValue(const Json& value, const DocPath& path,
                                             const GUID& type, const std::string& type_name) {
   if (value.is_null()) return nullptr;
   const bool inline_definition = value.is_object() && value.contains("type");
   if (type == kValueGuid && !value.is_string() && !inline_definition) {
-    const Track<float> track = ReadTrack(value, path, kNumber);
-    auto* channel = static_cast<Qen_ValueChannel*>(CreateByGuid(type, type_name, path));
-    Remember(channel, "", path);
-    RememberRange(channel, track);
-    channel->SetValue(track.Sample(0.0));
-    if (track.IsAnimated())
-      scene_->Animators.push_back(
-          [channel, track](double t) { channel->SetValue(track.Sample(t)); });
-    return channel;
+    return MakeValueChannel(ReadTrack(value, path, kNumber), type, type_name, path);
   }
   if (type == kValueVectorGuid && !value.is_string() && !inline_definition) {
-    const Track<D3DXVECTOR3> track = ReadTrack(value, path, kVector);
-    auto* channel = static_cast<Qen_ValueVectorChannel*>(CreateByGuid(type, type_name, path));
-    Remember(channel, "", path);
-    channel->SetVector(track.Sample(0.0));
-    if (track.IsAnimated())
-      scene_->Animators.push_back(
-          [channel, track](double t) { channel->SetVector(track.Sample(t)); });
-    return channel;
+    return MakeVectorChannel(ReadTrack(value, path, kVector), type, type_name, path);
   }
   if (type == kMatrixGuid && !value.is_string() && !inline_definition) {
     const Track<MatrixValue> track = ReadTrack(value, path, kMatrix);

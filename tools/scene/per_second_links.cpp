@@ -86,14 +86,7 @@ Qen_Channel* SceneBuilder::ResolvePerSecond(Qen_Channel* owner, int index, const
       k.Value *= scale;
       if (!std::isfinite(k.Value)) throw SceneError(at, kOutOfRange);
     }
-    auto* channel = static_cast<Qen_ValueChannel*>(CreateByGuid(type, type_name, path));
-    Remember(channel, "", path);
-    RememberRange(channel, track);
-    channel->SetValue(track.Sample(0.0));
-    if (track.IsAnimated())
-      scene_->Animators.push_back(
-          [channel, track](double t) { channel->SetValue(track.Sample(t)); });
-    return channel;
+    return MakeValueChannel(track, type, type_name, path);
   }
   Track<D3DXVECTOR3> track = ReadTrack(
       value[key], at, std::function<D3DXVECTOR3(const Json&, const DocPath&)>(ReadVector3));
@@ -102,13 +95,7 @@ Qen_Channel* SceneBuilder::ResolvePerSecond(Qen_Channel* owner, int index, const
     if (!std::isfinite(k.Value.x) || !std::isfinite(k.Value.y) || !std::isfinite(k.Value.z))
       throw SceneError(at, kOutOfRange);
   }
-  auto* channel = static_cast<Qen_ValueVectorChannel*>(CreateByGuid(type, type_name, path));
-  Remember(channel, "", path);
-  channel->SetVector(track.Sample(0.0));
-  if (track.IsAnimated())
-    scene_->Animators.push_back(
-        [channel, track](double t) { channel->SetVector(track.Sample(t)); });
-  return channel;
+  return MakeVectorChannel(track, type, type_name, path);
 }
 
 }  // namespace apescene

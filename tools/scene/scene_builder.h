@@ -35,6 +35,11 @@ class SceneBuilder {
   void Remember(const Qen_Channel* channel, const std::string& name, const DocPath& path);
   // Notes a Value channel's range over the shot.
   void RememberRange(const Qen_Channel* channel, const Track<float>& track);
+  // A new "Value" or "Value Vector" channel set from the track now and at every animated time.
+  Qen_Channel* MakeValueChannel(const Track<float>& track, const GUID& type,
+                                const std::string& type_name, const DocPath& path);
+  Qen_Channel* MakeVectorChannel(const Track<D3DXVECTOR3>& track, const GUID& type,
+                                 const std::string& type_name, const DocPath& path);
 
   // channel_config.cpp: fills a channel from its definition object.
   void Configure(Qen_Channel* channel, const Json& definition, const DocPath& path);
