@@ -19,6 +19,14 @@ constexpr float kHalfSizeFactor = 0.5f;     // Size is the full edge length
 constexpr float kCompositeHalfSpan = 0.5f;  // each image fills half of the composite's height
 constexpr int kBlock = 8;                   // slots per block
 
+// The block steps are inlined into each build of the loop below, so each is compiled for its
+// instruction set.
+#if defined(__GNUC__)
+#define APE_QUAD_STEP __attribute__((always_inline)) inline
+#else
+#define APE_QUAD_STEP inline
+#endif
+
 // One block of slots, one array per quantity.
 struct QuadBlock {
   // In: the render position P, the facing point, the half size h, and cos and sin of the spin.
@@ -34,7 +42,7 @@ struct QuadBlock {
   float Cx[4][kBlock], Cy[4][kBlock], Cz[4][kBlock];
 };
 
-void Gather(QuadBlock& b, const Particle* slots, int count, bool spin) {
+APE_QUAD_STEP void Gather(QuadBlock& b, const Particle* slots, int count, bool spin) {
   for (int k = 0; k < kBlock; ++k) {
     if (k >= count) {
       // Unused lanes compute on zeros and are never written out.
@@ -66,7 +74,7 @@ void Gather(QuadBlock& b, const Particle* slots, int count, bool spin) {
 //   otherwise R = normalize(Up x N), U = N x R; with Right = (1, 0, 0) and Up = (0, 1, 0). Only
 //   the first cross product is normalized: the second is of two perpendicular unit vectors.
 //   A = R h and B = U h, before any spin.
-void ComputeExtents(QuadBlock& b) {
+APE_QUAD_STEP void ComputeExtents(QuadBlock& b) {
   for (int k = 0; k < kBlock; ++k) {
     const float dx = b.Lx[k] - b.Px[k];
     const float dy = b.Ly[k] - b.Py[k];
@@ -123,7 +131,7 @@ void ComputeExtents(QuadBlock& b) {
 
 // The spin turns R h and U h (in A and B): A = (R h) cos + (U h) sin and
 // B = (U h) cos + ((-R) h) sin, where (-R) h is exactly -(R h).
-void Spin(QuadBlock& b) {
+APE_QUAD_STEP void Spin(QuadBlock& b) {
   for (int k = 0; k < kBlock; ++k) {
     const float c = b.Cos[k];
     const float s = b.Sin[k];
@@ -139,7 +147,7 @@ void Spin(QuadBlock& b) {
 }
 
 // Each coordinate summed left to right, as the rule writes the corners.
-void ComputeCorners(QuadBlock& b) {
+APE_QUAD_STEP void ComputeCorners(QuadBlock& b) {
   for (int k = 0; k < kBlock; ++k) {
     b.Cx[0][k] = b.Px[k] + b.Ax[k] + b.Bx[k];
     b.Cy[0][k] = b.Py[k] + b.Ay[k] + b.By[k];
@@ -162,14 +170,14 @@ struct TextureRows {
 };
 
 // Free particles show the composite's upper image, attached ones its lower image.
-TextureRows RowsFor(bool has_composite, bool attached) {
+APE_QUAD_STEP TextureRows RowsFor(bool has_composite, bool attached) {
   if (!has_composite) return {0.0f, 1.0f};
   return {attached ? kCompositeHalfSpan : 0.0f, kCompositeHalfSpan};
 }
 
 // Corners in the order the fixed index list draws them: (0, 1, 2) and (2, 3, 0).
-void WriteQuads(LocalVertex* out, const QuadBlock& b, const Particle* slots, int count,
-                bool has_composite) {
+APE_QUAD_STEP void WriteQuads(LocalVertex* out, const QuadBlock& b, const Particle* slots,
+                              int count, bool has_composite) {
   constexpr float kTu[4] = {0.0f, 1.0f, 1.0f, 0.0f};
   for (int k = 0; k < count; ++k) {
     const D3DXVECTOR3 normal(b.Nx[k], b.Ny[k], b.Nz[k]);
@@ -183,19 +191,33 @@ void WriteQuads(LocalVertex* out, const QuadBlock& b, const Particle* slots, int
   }
 }
 
+// Built twice where the compiler and loader support it: the AVX2 build does a block of 8 lanes
+// per instruction (its divides and square roots are the same correctly rounded IEEE operations,
+// and no multiply-add is formed), the default build is picked on other processors.
+#if defined(__x86_64__) && defined(__GNUC__) && !defined(__clang__)
+#define APE_QUAD_CLONES __attribute__((target_clones("avx2", "default")))
+#else
+#define APE_QUAD_CLONES
+#endif
+
+APE_QUAD_CLONES void BuildQuads(LocalVertex* out, const Particle* particles, std::size_t slots,
+                                bool spin, bool has_composite) {
+  QuadBlock block;
+  for (std::size_t first = 0; first < slots; first += kBlock) {
+    const int count = static_cast<int>(std::min<std::size_t>(kBlock, slots - first));
+    const Particle* block_slots = particles + first;
+    Gather(block, block_slots, count, spin);
+    ComputeExtents(block);
+    if (spin) Spin(block);
+    ComputeCorners(block);
+    WriteQuads(out + 4 * first, block, block_slots, count, has_composite);
+  }
+}
+
 }  // namespace
 
 void Tev_AdvancedParticleEmitter::UpdateLocalVertexBuffer() {
   if (LocalVertices == nullptr) return;
   const std::size_t slots = std::min(DrawnSlotCount(ParticleCount), Particles.size());
-  QuadBlock block;
-  for (std::size_t first = 0; first < slots; first += kBlock) {
-    const int count = static_cast<int>(std::min<std::size_t>(kBlock, slots - first));
-    const Particle* particles = Particles.data() + first;
-    Gather(block, particles, count, SpinEnabled);
-    ComputeExtents(block);
-    if (SpinEnabled) Spin(block);
-    ComputeCorners(block);
-    WriteQuads(LocalVertices + 4 * first, block, particles, count, HasCompositeTexture);
-  }
+  BuildQuads(LocalVertices, Particles.data(), slots, SpinEnabled, HasCompositeTexture);
 }
