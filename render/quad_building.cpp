@@ -384,7 +384,7 @@ APE_QUAD_STEP void WriteQuads(LocalVertex* out, const QuadRows& s, int count) {
 
 APE_QUAD_CLONES void BuildQuads(LocalVertex* out, const Particle* particles, std::size_t slots,
                                 bool spin, bool has_composite) {
-  QuadBlock block;
+  QuadBlock block{};  // RowsOf takes only addresses, but the compiler cannot tell
   const QuadRows rows = RowsOf(block);
   for (std::size_t first = 0; first < slots; first += kBlock) {
     const int count = static_cast<int>(std::min<std::size_t>(kBlock, slots - first));
