@@ -72,12 +72,8 @@ FadedMotion FadeWithAge(const Tev_AdvancedParticleEmitter& e, const Particle& p)
 [[gnu::always_inline]] inline void IntegrateVelocity(const Tev_AdvancedParticleEmitter& e,
                                                      const LiveStepFacts& facts, Particle& p) {
   const float s = facts.Scale;
-  if (!facts.SmokeFades) {
-    p.Velocity += (e.GlobalForce + p.SmokeForce + p.AttractorForce) * s * s;
-    if (facts.SpeedLimit) LimitSpeed(p, e.MaximumSpeed, s);
-    return;
-  }
-  const FadedMotion motion = FadeWithAge(e, p);
+  const FadedMotion motion =
+      facts.SmokeFades ? FadeWithAge(e, p) : FadedMotion{e.MaximumSpeed, e.GlobalForce};
   p.Velocity += (motion.GlobalForce + p.SmokeForce + p.AttractorForce) * s * s;
   if (facts.SpeedLimit) LimitSpeed(p, motion.MaximumSpeed, s);
 }
