@@ -76,26 +76,6 @@ TEST(StudioEngine, RefusedEditsLeaveTheEffectAsItWas) {
   }
 }
 
-TEST(StudioEngine, UndoAndRedoBringDocumentsBack) {
-  const ScratchFolder folder;
-  auto engine = OpenStudio(folder, "fountain.json", "null");
-  ASSERT_NE(engine, nullptr);
-  const Json original = engine->Document();
-  EXPECT_FALSE(engine->Undo().Ok);
-  ASSERT_TRUE(engine->Edit(LinkPath("Births Per Second"), 900).Ok);
-  ASSERT_TRUE(engine->Edit(LinkPath("Lifespan_Max"), 3).Ok);
-  const Json edited = engine->Document();
-  EXPECT_EQ(edited["channels"]["sparks"]["links"]["Births Per Second"], 900);
-  ASSERT_TRUE(engine->Undo().Ok);
-  ASSERT_TRUE(engine->Undo().Ok);
-  EXPECT_EQ(engine->Document(), original);
-  EXPECT_FALSE(engine->Undo().Ok);
-  ASSERT_TRUE(engine->Redo().Ok);
-  ASSERT_TRUE(engine->Redo().Ok);
-  EXPECT_EQ(engine->Document(), edited);
-  EXPECT_FALSE(engine->Redo().Ok);
-}
-
 // While playing, a change of one link's value reaches the running particles on the next frame,
 // without starting again; paused, the frame shown is re-simulated with the change from frame 1.
 TEST(StudioEngine, EditsReachTheRunningEffect) {
